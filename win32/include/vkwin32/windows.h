@@ -1,0 +1,8 @@
+// The Win32 subset that vaskel implements on POSIX systems.
+#pragma once
+
+#include "crt.h"
+#include "interlocked.h"
+#include "kernel.h"
+#include "types.h"
+#include "winerror.h"

@@ -1,0 +1,192 @@
+// Code-page conversions. The ANSI, OEM and thread code pages are UTF-8 here;
+// malformed input becomes U+FFFD per maximal ill-formed subsequence, as the
+// Unicode standard recommends and Windows does.
+#include <vkwin32/kernel.h>
+
+#include <cstring>
+
+namespace {
+
+const char16_t replacement = 0xFFFD;
+
+bool IsUtf8CodePage(UINT codePage) {
+    return codePage == CP_ACP || codePage == CP_OEMCP || codePage == CP_THREAD_ACP ||
+           codePage == CP_UTF8;
+}
+
+bool InRange(unsigned char c, unsigned char low, unsigned char high) {
+    return c >= low && c <= high;
+}
+
+// Decodes one code point at text[i], advancing i. Returns false for an
+// ill-formed sequence, of which i then skips the maximal subpart.
+bool DecodeUtf8(const unsigned char* text, int length, int& i, char32_t& cp) {
+    unsigned char lead = text[i++];
+    if (lead < 0x80) {
+        cp = lead;
+        return true;
+    }
+    int trail;
+    unsigned char low = 0x80, high = 0xBF;
+    if (InRange(lead, 0xC2, 0xDF)) {
+        trail = 1;
+        cp = lead & 0x1F;
+    } else if (InRange(lead, 0xE0, 0xEF)) {
+        trail = 2;
+        cp = lead & 0x0F;
+        if (lead == 0xE0)
+            low = 0xA0;
+        else if (lead == 0xED)
+            high = 0x9F;
+    } else if (InRange(lead, 0xF0, 0xF4)) {
+        trail = 3;
+        cp = lead & 0x07;
+        if (lead == 0xF0)
+            low = 0x90;
+        else if (lead == 0xF4)
+            high = 0x8F;
+    } else {
+        return false;
+    }
+    for (int k = 0; k < trail; ++k) {
+        if (i >= length || !InRange(text[i], low, high))
+            return false;
+        cp = (cp << 6) | (text[i++] & 0x3F);
+        low = 0x80;
+        high = 0xBF;
+    }
+    return true;
+}
+
+int Utf16Units(char32_t cp) { return cp >= 0x10000 ? 2 : 1; }
+
+} // namespace
+
+extern "C" UINT WINAPI GetACP(void) { return CP_UTF8; }
+
+extern "C" int WINAPI MultiByteToWideChar(UINT codePage, DWORD flags, LPCSTR multiByteStr,
+                                          int multiByteCount, LPWSTR wideCharStr,
+                                          int wideCharCount) {
+    if (multiByteStr == nullptr || multiByteCount == 0 || multiByteCount < -1 ||
+        wideCharCount < 0 || (wideCharStr == nullptr && wideCharCount != 0) ||
+        static_cast<const void*>(multiByteStr) == static_cast<const void*>(wideCharStr) ||
+        !IsUtf8CodePage(codePage)) {
+        SetLastError(ERROR_INVALID_PARAMETER);
+        return 0;
+    }
+    if ((flags & ~static_cast<DWORD>(MB_ERR_INVALID_CHARS)) != 0) {
+        SetLastError(ERROR_INVALID_FLAGS);
+        return 0;
+    }
+    int length = multiByteCount == -1 ? static_cast<int>(std::strlen(multiByteStr)) + 1
+                                      : multiByteCount;
+    const auto* text = reinterpret_cast<const unsigned char*>(multiByteStr);
+    int needed = 0;
+    bool overflow = false;
+    for (int i = 0; i < length;) {
+        char32_t cp;
+        if (!DecodeUtf8(text, length, i, cp)) {
+            if (flags & MB_ERR_INVALID_CHARS) {
+                SetLastError(ERROR_NO_UNICODE_TRANSLATION);
+                return 0;
+            }
+            cp = replacement;
+        }
+        int units = Utf16Units(cp);
+        if (wideCharCount != 0) {
+            if (needed + units > wideCharCount) {
+                overflow = true;
+                break;
+            }
+            if (units == 2) {
+                cp -= 0x10000;
+                wideCharStr[needed] = static_cast<char16_t>(0xD800 + (cp >> 10));
+                wideCharStr[needed + 1] = static_cast<char16_t>(0xDC00 + (cp & 0x3FF));
+            } else {
+                wideCharStr[needed] = static_cast<char16_t>(cp);
+            }
+        }
+        needed += units;
+    }
+    if (overflow) {
+        SetLastError(ERROR_INSUFFICIENT_BUFFER);
+        return 0;
+    }
+    return needed;
+}
+
+extern "C" int WINAPI WideCharToMultiByte(UINT codePage, DWORD flags, LPCWSTR wideCharStr,
+                                          int wideCharCount, LPSTR multiByteStr,
+                                          int multiByteCount, LPCSTR defaultChar,
+                                          LPBOOL usedDefaultChar) {
+    if (wideCharStr == nullptr || wideCharCount == 0 || wideCharCount < -1 ||
+        multiByteCount < 0 || (multiByteStr == nullptr && multiByteCount != 0) ||
+        static_cast<const void*>(multiByteStr) == static_cast<const void*>(wideCharStr) ||
+        !IsUtf8CodePage(codePage) ||
+        (codePage == CP_UTF8 && (defaultChar != nullptr || usedDefaultChar != nullptr))) {
+        SetLastError(ERROR_INVALID_PARAMETER);
+        return 0;
+    }
+    if (codePage == CP_UTF8 && (flags & ~static_cast<DWORD>(WC_ERR_INVALID_CHARS)) != 0) {
+        SetLastError(ERROR_INVALID_FLAGS);
+        return 0;
+    }
+    if (usedDefaultChar)
+        *usedDefaultChar = FALSE; // every character has a UTF-8 form
+    int length = wideCharCount;
+    if (length == -1) {
+        length = 0;
+        while (wideCharStr[length] != 0)
+            ++length;
+        ++length;
+    }
+    int needed = 0;
+    bool overflow = false;
+    for (int i = 0; i < length;) {
+        char32_t cp = wideCharStr[i++];
+        if (cp >= 0xD800 && cp <= 0xDBFF && i < length && wideCharStr[i] >= 0xDC00 &&
+            wideCharStr[i] <= 0xDFFF) {
+            cp = 0x10000 + ((cp - 0xD800) << 10) + (wideCharStr[i++] - 0xDC00);
+        } else if (cp >= 0xD800 && cp <= 0xDFFF) {
+            if (flags & WC_ERR_INVALID_CHARS) {
+                SetLastError(ERROR_NO_UNICODE_TRANSLATION);
+                return 0;
+            }
+            cp = replacement;
+        }
+        char bytes[4];
+        int count;
+        if (cp < 0x80) {
+            bytes[0] = static_cast<char>(cp);
+            count = 1;
+        } else if (cp < 0x800) {
+            bytes[0] = static_cast<char>(0xC0 | (cp >> 6));
+            bytes[1] = static_cast<char>(0x80 | (cp & 0x3F));
+            count = 2;
+        } else if (cp < 0x10000) {
+            bytes[0] = static_cast<char>(0xE0 | (cp >> 12));
+            bytes[1] = static_cast<char>(0x80 | ((cp >> 6) & 0x3F));
+            bytes[2] = static_cast<char>(0x80 | (cp & 0x3F));
+            count = 3;
+        } else {
+            bytes[0] = static_cast<char>(0xF0 | (cp >> 18));
+            bytes[1] = static_cast<char>(0x80 | ((cp >> 12) & 0x3F));
+            bytes[2] = static_cast<char>(0x80 | ((cp >> 6) & 0x3F));
+            bytes[3] = static_cast<char>(0x80 | (cp & 0x3F));
+            count = 4;
+        }
+        if (multiByteCount != 0) {
+            if (needed + count > multiByteCount) {
+                overflow = true;
+                break;
+            }
+            std::memcpy(multiByteStr + needed, bytes, static_cast<size_t>(count));
+        }
+        needed += count;
+    }
+    if (overflow) {
+        SetLastError(ERROR_INSUFFICIENT_BUFFER);
+        return 0;
+    }
+    return needed;
+}

@@ -1,0 +1,9 @@
+#include <vkwin32/kernel.h>
+
+namespace {
+thread_local DWORD lastError = ERROR_SUCCESS;
+}
+
+extern "C" DWORD WINAPI GetLastError(void) { return lastError; }
+
+extern "C" void WINAPI SetLastError(DWORD errorCode) { lastError = errorCode; }

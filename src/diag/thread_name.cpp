@@ -1,0 +1,7 @@
+#include <vaskel/diag.h>
+
+namespace vaskel {
+
+void VKSetThreadName(const char* /*name*/, DWORD /*threadId*/) {}
+
+} // namespace vaskel

@@ -1,1 +1,154 @@
-int main() { return 0; }
+// A tour of vaskel: each family at work, printing what it did.
+#include <vaskel/diag.h>
+#include <vaskel/framework/archive.h>
+#include <vaskel/framework/array.h>
+#include <vaskel/framework/list.h>
+#include <vaskel/framework/mem_file.h>
+#include <vaskel/framework/string.h>
+#include <vaskel/queue.h>
+#include <vaskel/sync.h>
+#include <vaskel/text.h>
+#include <vaskel/value.h>
+
+#include <cstdio>
+
+using namespace vaskel;
+
+namespace {
+
+void Section(const char* title) { std::printf("\n== %s\n", title); }
+
+void TourStrings() {
+    Section("Strings and containers");
+    CString greeting("Hello");
+    CString copy = greeting;
+    copy += ", world";
+    std::printf("'%s' copied and extended to '%s'; the original is unchanged\n",
+                greeting.GetString(), copy.GetString());
+    CString formatted;
+    formatted.Format("%d items at %.2f each", 3, 9.5);
+    std::printf("formatted: '%s'\n", formatted.GetString());
+
+    CStringArray words;
+    CString sentence("red green blue");
+    int position = 0;
+    for (CString word = sentence.Tokenize(" ", position); position >= 0;
+         word = sentence.Tokenize(" ", position))
+        words.Add(word);
+    std::printf("tokenized into %d words; the last is '%s'\n", static_cast<int>(words.GetSize()),
+                words[words.GetUpperBound()].GetString());
+
+    CStringList list;
+    list.AddTail("second");
+    list.AddHead("first");
+    std::printf("list:");
+    for (POSITION pos = list.GetHeadPosition(); pos;)
+        std::printf(" %s", list.GetNext(pos).GetString());
+    std::printf("\n");
+}
+
+void TourArchive() {
+    Section("Archives");
+    CMemFile file;
+    {
+        CArchive store(&file, CArchive::store);
+        store << CString('a', 300) << 42L << 2.5;
+    }
+    BYTE* bytes = nullptr;
+    file.SeekToBegin();
+    file.GetBufferPtr(CFile::bufferRead, 3, reinterpret_cast<void**>(&bytes));
+    std::printf("stored %d bytes; a 300-character string starts %02X %02X %02X\n",
+                static_cast<int>(file.GetLength()), bytes[0], bytes[1], bytes[2]);
+    file.SeekToBegin();
+    CArchive load(&file, CArchive::load);
+    CString text;
+    long number = 0;
+    double fraction = 0;
+    load >> text >> number >> fraction;
+    std::printf("loaded back: %d characters, %ld, %.1f\n", text.GetLength(), number, fraction);
+    try {
+        load >> number;
+    } catch (const CArchiveException& error) {
+        std::printf("reading past the end: archive exception, cause %d\n", error.m_cause);
+    }
+}
+
+void TourDiagnostics() {
+    Section("Diagnostics");
+    try {
+        throw unexpected_error();
+    } catch (const std::exception&) {
+        std::printf("unexpected_error caught as std::exception\n");
+    }
+    {
+        CVKInsideAssert reporting;
+        std::printf("inside an assertion report: %s\n",
+                    CVKInsideAssert::IsInsideAssert() ? "yes" : "no");
+    }
+    CVKDebugConditions::SetCondition(3, 7);
+    std::printf("debug condition 3 = %u, table of %u entries\n",
+                static_cast<unsigned>(CVKDebugConditions::GetCondition(3)),
+                static_cast<unsigned>(CVKDebugConditions::GetConditionCount()));
+    ClearStatus87();
+    volatile double zero = 0.0;
+    volatile double infinity = 1.0 / zero;
+    (void)infinity;
+    std::printf("after 1/0 the zero-divide flag is %s\n",
+                (ClearStatus87() & _SW_ZERODIVIDE) ? "set" : "clear");
+}
+
+struct PrintCmd : CVKAsyncCmd {
+    explicit PrintCmd(const char* what) : what(what) {}
+    void Execute() override { std::printf("command runs: %s\n", what); }
+    void Canceled() override { std::printf("command cancelled: %s\n", what); }
+    const char* what;
+};
+
+void TourCommands() {
+    Section("Commands");
+    old_auto_ptr<CVKAsyncCmd> owner(new PrintCmd("print a line"));
+    old_auto_ptr<CVKAsyncCmd> queued(owner); // ownership moves with the copy
+    std::printf("after handing over: the first holder owns it: %s, the second: %s\n",
+                owner.owns() ? "yes" : "no", queued.owns() ? "yes" : "no");
+    queued->Execute();
+    owner->Canceled();
+}
+
+void TourLifetime() {
+    Section("Lifetime marker");
+    auto* marker = new SimpleDestroyedMarker;
+    SimpleDestroyedMarker::Watcher watcher(*marker);
+    marker->SetDestroying();
+    std::printf("while tearing down the watcher sees: %s\n",
+                watcher.IsDestroying() ? "destroying" : "?");
+    delete marker;
+    std::printf("after the object is gone it sees: %s\n",
+                watcher.IsDestroyed() ? "destroyed" : "?");
+}
+
+void TourValuesAndText() {
+    Section("Values and text");
+    CRGBColor orange;
+    orange.SetColor(255, 128, 0);
+    std::printf("orange is 0x%06X, written %s\n", static_cast<unsigned>(orange.GetColor()),
+                orange.ToString().GetString());
+    const char* text = "Find the NEEDLE here";
+    const char* hit = VKFindStringNoCase(text, 20, "needle", 6);
+    std::printf("'needle' found without case at offset %d\n", hit ? static_cast<int>(hit - text) : -1);
+    char buffer[6];
+    VKCopyStringToBuffer(buffer, sizeof buffer, CString("truncated"));
+    std::printf("copied into 6 bytes: '%s'\n", buffer);
+}
+
+} // namespace
+
+int main() {
+    std::printf("vaskel tour\n");
+    TourStrings();
+    TourArchive();
+    TourDiagnostics();
+    TourCommands();
+    TourLifetime();
+    TourValuesAndText();
+    return 0;
+}

@@ -16,7 +16,9 @@ using namespace vaskel;
 
 namespace {
 
-void Section(const char* title) { std::printf("\n== %s\n", title); }
+void Section(const char* title) {
+    std::printf("\n== %s\n", title);
+}
 
 void TourStrings() {
     Section("Strings and containers");
@@ -134,7 +136,8 @@ void TourValuesAndText() {
                 orange.ToString().GetString());
     const char* text = "Find the NEEDLE here";
     const char* hit = VKFindStringNoCase(text, 20, "needle", 6);
-    std::printf("'needle' found without case at offset %d\n", hit ? static_cast<int>(hit - text) : -1);
+    std::printf("'needle' found without case at offset %d\n",
+                hit ? static_cast<int>(hit - text) : -1);
     char buffer[6];
     VKCopyStringToBuffer(buffer, sizeof buffer, CString("truncated"));
     std::printf("copied into 6 bytes: '%s'\n", buffer);

@@ -25,13 +25,16 @@ public:
     int GetBlue() const { return static_cast<int>((m_color >> 16) & 0xFF); }
     // Each rebuilds the value from the three components; bits 24-31 become 0.
     void SetRed(unsigned char red) {
-        SetColor(red, static_cast<unsigned char>(GetGreen()), static_cast<unsigned char>(GetBlue()));
+        SetColor(red, static_cast<unsigned char>(GetGreen()),
+                 static_cast<unsigned char>(GetBlue()));
     }
     void SetGreen(unsigned char green) {
-        SetColor(static_cast<unsigned char>(GetRed()), green, static_cast<unsigned char>(GetBlue()));
+        SetColor(static_cast<unsigned char>(GetRed()), green,
+                 static_cast<unsigned char>(GetBlue()));
     }
     void SetBlue(unsigned char blue) {
-        SetColor(static_cast<unsigned char>(GetRed()), static_cast<unsigned char>(GetGreen()), blue);
+        SetColor(static_cast<unsigned char>(GetRed()), static_cast<unsigned char>(GetGreen()),
+                 blue);
     }
 
     // "{red,green,blue}" in decimal.

@@ -6,9 +6,25 @@
 #ifndef NOMINMAX
 #define NOMINMAX
 #endif
-#include <windows.h>
 #include <float.h>
 #include <mbstring.h>
+#include <windows.h>
+// Some runtime headers name only the exception masks; the status bits are the same.
+#ifndef _SW_INVALID
+#define _SW_INVALID _EM_INVALID
+#endif
+#ifndef _SW_ZERODIVIDE
+#define _SW_ZERODIVIDE _EM_ZERODIVIDE
+#endif
+#ifndef _SW_OVERFLOW
+#define _SW_OVERFLOW _EM_OVERFLOW
+#endif
+#ifndef _SW_UNDERFLOW
+#define _SW_UNDERFLOW _EM_UNDERFLOW
+#endif
+#ifndef _SW_INEXACT
+#define _SW_INEXACT _EM_INEXACT
+#endif
 #else
 #include <vkwin32/windows.h>
 #endif

@@ -2,8 +2,12 @@
 
 namespace vaskel {
 
-DWORD GetStatus87() { return _statusfp(); }
+DWORD GetStatus87() {
+    return _statusfp();
+}
 
-DWORD ClearStatus87() { return _clearfp(); }
+DWORD ClearStatus87() {
+    return _clearfp();
+}
 
 } // namespace vaskel

@@ -12,6 +12,8 @@ CVKInsideAssert::~CVKInsideAssert() {
     InterlockedDecrement(reinterpret_cast<volatile LONG*>(&m_nInsideAssert));
 }
 
-bool CVKInsideAssert::IsInsideAssert() { return m_nInsideAssert > 0; }
+bool CVKInsideAssert::IsInsideAssert() {
+    return m_nInsideAssert > 0;
+}
 
 } // namespace vaskel

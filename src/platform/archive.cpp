@@ -143,8 +143,11 @@ UINT CArchive::Read(void* buffer, UINT count) {
     while (done < count) {
         if (m_cursor == m_end) {
             if (count - done >= m_nBufferSize) {
-                UINT got = m_pFile->Read(out + done, count - done);
-                done += got;
+                // A large block goes straight from the file; a file may
+                // deliver it in parts, and only 0 means the end.
+                UINT got;
+                while (done < count && (got = m_pFile->Read(out + done, count - done)) > 0)
+                    done += got;
                 break;
             }
             FillBuffer();
@@ -186,14 +189,30 @@ T CArchive::Take() {
     return Decode<T>(bytes);
 }
 
-CArchive& CArchive::operator<<(BYTE value) { return Put<BYTE>(value); }
-CArchive& CArchive::operator<<(WORD value) { return Put<WORD>(value); }
-CArchive& CArchive::operator<<(short value) { return Put<WORD>(static_cast<WORD>(value)); }
-CArchive& CArchive::operator<<(char value) { return Put<BYTE>(static_cast<BYTE>(value)); }
-CArchive& CArchive::operator<<(WCHAR value) { return Put<WORD>(static_cast<WORD>(value)); }
-CArchive& CArchive::operator<<(bool value) { return Put<BYTE>(value ? 1 : 0); }
-CArchive& CArchive::operator<<(int value) { return Put<DWORD>(static_cast<DWORD>(value)); }
-CArchive& CArchive::operator<<(unsigned int value) { return Put<DWORD>(value); }
+CArchive& CArchive::operator<<(BYTE value) {
+    return Put<BYTE>(value);
+}
+CArchive& CArchive::operator<<(WORD value) {
+    return Put<WORD>(value);
+}
+CArchive& CArchive::operator<<(short value) {
+    return Put<WORD>(static_cast<WORD>(value));
+}
+CArchive& CArchive::operator<<(char value) {
+    return Put<BYTE>(static_cast<BYTE>(value));
+}
+CArchive& CArchive::operator<<(WCHAR value) {
+    return Put<WORD>(static_cast<WORD>(value));
+}
+CArchive& CArchive::operator<<(bool value) {
+    return Put<BYTE>(value ? 1 : 0);
+}
+CArchive& CArchive::operator<<(int value) {
+    return Put<DWORD>(static_cast<DWORD>(value));
+}
+CArchive& CArchive::operator<<(unsigned int value) {
+    return Put<DWORD>(value);
+}
 
 CArchive& CArchive::operator<<(long value) {
     CheckStoring();
@@ -209,8 +228,12 @@ CArchive& CArchive::operator<<(unsigned long value) {
     return Put<DWORD>(static_cast<DWORD>(value));
 }
 
-CArchive& CArchive::operator<<(long long value) { return Put<ULONGLONG>(static_cast<ULONGLONG>(value)); }
-CArchive& CArchive::operator<<(unsigned long long value) { return Put<ULONGLONG>(value); }
+CArchive& CArchive::operator<<(long long value) {
+    return Put<ULONGLONG>(static_cast<ULONGLONG>(value));
+}
+CArchive& CArchive::operator<<(unsigned long long value) {
+    return Put<ULONGLONG>(value);
+}
 
 CArchive& CArchive::operator<<(float value) {
     DWORD bits;
@@ -326,12 +349,14 @@ CArchive& CArchive::operator>>(CString& value) {
     CheckLoading();
     bool wide;
     DWORD length = ReadStringLength(wide);
-    if (length > static_cast<DWORD>(INT_MAX / 2))
-        AfxThrowArchiveException(CArchiveException::genericException);
+    // The length is checked against what a CString can hold only as the text
+    // arrives, so a prefix promising more than the input has ends in endOfFile.
     if (!wide) {
         CString text;
         for (DWORD done = 0; done < length;) {
             UINT step = std::min<DWORD>(stringChunk, length - done);
+            if (done + step > static_cast<DWORD>(INT_MAX))
+                AfxThrowArchiveException(CArchiveException::genericException);
             char* chars = text.GetBuffer(static_cast<int>(done + step));
             ReadExact(chars + done, step);
             done += step;
@@ -344,6 +369,9 @@ CArchive& CArchive::operator>>(CString& value) {
     std::vector<BYTE> bytes;
     for (DWORD done = 0; done < length;) {
         UINT step = std::min<DWORD>(stringChunk, length - done);
+        // Every UTF-16 unit becomes at least one character of text.
+        if (done + step > static_cast<DWORD>(INT_MAX))
+            AfxThrowArchiveException(CArchiveException::genericException);
         bytes.resize(static_cast<size_t>(step) * 2);
         ReadExact(bytes.data(), step * 2);
         for (UINT i = 0; i < step; ++i)

@@ -43,7 +43,9 @@ const char* MessageOf(const char* const (&messages)[N], int cause) {
 
 } // namespace
 
-const char* CException::what() const noexcept { return "A framework exception occurred."; }
+const char* CException::what() const noexcept {
+    return "A framework exception occurred.";
+}
 
 bool CException::GetErrorMessage(char* buffer, UINT maxLength, UINT* helpContext) const {
     if (helpContext)
@@ -57,15 +59,21 @@ bool CException::GetErrorMessage(char* buffer, UINT maxLength, UINT* helpContext
     return true;
 }
 
-CString CException::GetErrorMessage() const { return what(); }
+CString CException::GetErrorMessage() const {
+    return what();
+}
 
-const char* CMemoryException::what() const noexcept { return "Out of memory."; }
+const char* CMemoryException::what() const noexcept {
+    return "Out of memory.";
+}
 
 const char* CInvalidArgException::what() const noexcept {
     return "Encountered an improper argument.";
 }
 
-const char* COleException::what() const noexcept { return "An OLE error occurred."; }
+const char* COleException::what() const noexcept {
+    return "An OLE error occurred.";
+}
 
 CString COleException::GetErrorMessage() const {
     CString message;
@@ -76,7 +84,9 @@ CString COleException::GetErrorMessage() const {
 CArchiveException::CArchiveException(int cause, const char* archiveName)
     : m_cause(cause), m_strFileName(archiveName) {}
 
-const char* CArchiveException::what() const noexcept { return MessageOf(archiveMessages, m_cause); }
+const char* CArchiveException::what() const noexcept {
+    return MessageOf(archiveMessages, m_cause);
+}
 
 CString CArchiveException::GetErrorMessage() const {
     CString message(what());
@@ -88,7 +98,9 @@ CString CArchiveException::GetErrorMessage() const {
 CFileException::CFileException(int cause, LONG osError, const char* fileName)
     : m_cause(cause), m_lOsError(osError), m_strFileName(fileName) {}
 
-const char* CFileException::what() const noexcept { return MessageOf(fileMessages, m_cause); }
+const char* CFileException::what() const noexcept {
+    return MessageOf(fileMessages, m_cause);
+}
 
 CString CFileException::GetErrorMessage() const {
     CString message(what());
@@ -144,11 +156,17 @@ int CFileException::OsErrorToException(LONG osError) {
     }
 }
 
-void AfxThrowMemoryException() { throw CMemoryException(); }
+void AfxThrowMemoryException() {
+    throw CMemoryException();
+}
 
-void AfxThrowInvalidArgException() { throw CInvalidArgException(); }
+void AfxThrowInvalidArgException() {
+    throw CInvalidArgException();
+}
 
-void AfxThrowOleException(HRESULT sc) { throw COleException(sc); }
+void AfxThrowOleException(HRESULT sc) {
+    throw COleException(sc);
+}
 
 void AfxThrowArchiveException(int cause, const char* archiveName) {
     throw CArchiveException(cause, archiveName);

@@ -170,11 +170,12 @@ void CFile::Flush() {
 
 void CFile::Close() {
     HANDLE file = m_hFile;
+    CString name = m_strFileName;
     m_hFile = INVALID_HANDLE_VALUE;
     m_strFileName.Empty();
     if (file != INVALID_HANDLE_VALUE && !CloseHandle(file)) {
         LONG osError = static_cast<LONG>(GetLastError());
-        AfxThrowFileException(CFileException::OsErrorToException(osError), osError);
+        AfxThrowFileException(CFileException::OsErrorToException(osError), osError, name);
     }
 }
 
@@ -196,9 +197,13 @@ CString CFile::GetFileTitle() const {
     return dot > 0 ? name.Left(dot) : name;
 }
 
-CString CFile::GetFilePath() const { return m_strFileName; }
+CString CFile::GetFilePath() const {
+    return m_strFileName;
+}
 
-void CFile::SetFilePath(const char* newName) { m_strFileName = newName; }
+void CFile::SetFilePath(const char* newName) {
+    m_strFileName = newName;
+}
 
 bool CFile::GetStatus(CFileStatus& status) const {
     if (m_hFile == INVALID_HANDLE_VALUE || m_strFileName.IsEmpty())

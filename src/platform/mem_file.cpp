@@ -1,6 +1,7 @@
 #include <vaskel/framework/mem_file.h>
 
 #include <algorithm>
+#include <cstdint>
 #include <cstdlib>
 #include <cstring>
 #include <limits>
@@ -13,7 +14,9 @@ CMemFile::CMemFile(BYTE* buffer, UINT bufferSize, UINT growBytes) : m_nGrowBytes
     Attach(buffer, bufferSize, growBytes);
 }
 
-CMemFile::~CMemFile() { FreeOwnBuffer(); }
+CMemFile::~CMemFile() {
+    FreeOwnBuffer();
+}
 
 void CMemFile::FreeOwnBuffer() {
     if (m_bAutoDelete)
@@ -48,18 +51,26 @@ void CMemFile::Grow(SIZE_T newSize) {
     if (m_nGrowBytes == 0)
         AfxThrowMemoryException();
     SIZE_T grown = std::max(newSize, m_nBufferSize + m_nBufferSize / 2);
+    // Rounding up to the step must not wrap around to a small size.
+    if (grown > std::numeric_limits<SIZE_T>::max() - (m_nGrowBytes - 1))
+        AfxThrowMemoryException();
     grown = (grown + m_nGrowBytes - 1) / m_nGrowBytes * m_nGrowBytes;
     BYTE* buffer;
+    SIZE_T kept;
     if (m_bAutoDelete) {
         buffer = static_cast<BYTE*>(std::realloc(m_lpBuffer, grown));
+        kept = m_nBufferSize;
     } else {
         // The caller's buffer stays the caller's: the file moves to its own.
         buffer = static_cast<BYTE*>(std::malloc(grown));
-        if (buffer && m_nFileSize)
-            std::memcpy(buffer, m_lpBuffer, m_nFileSize);
+        kept = m_nFileSize;
+        if (buffer && kept)
+            std::memcpy(buffer, m_lpBuffer, kept);
     }
     if (!buffer)
         AfxThrowMemoryException();
+    // New room never shows what the heap held before, whatever a caller commits.
+    std::memset(buffer + kept, 0, grown - kept);
     m_lpBuffer = buffer;
     m_nBufferSize = grown;
     m_bAutoDelete = true;
@@ -85,11 +96,18 @@ void CMemFile::Write(const void* buffer, UINT count) {
     if (m_nPosition > std::numeric_limits<SIZE_T>::max() - count)
         AfxThrowMemoryException();
     SIZE_T end = m_nPosition + count;
+    // The data may come from the file's own buffer, which growing moves.
+    const BYTE* data = static_cast<const BYTE*>(buffer);
+    std::uintptr_t offset =
+        reinterpret_cast<std::uintptr_t>(data) - reinterpret_cast<std::uintptr_t>(m_lpBuffer);
+    bool fromOwnBuffer = m_bAutoDelete && offset < m_nBufferSize;
     Grow(end);
+    if (fromOwnBuffer)
+        data = m_lpBuffer + offset;
     // A gap left by seeking past the end reads as zeros.
     if (m_nPosition > m_nFileSize)
         std::memset(m_lpBuffer + m_nFileSize, 0, m_nPosition - m_nFileSize);
-    std::memmove(m_lpBuffer + m_nPosition, buffer, count);
+    std::memmove(m_lpBuffer + m_nPosition, data, count);
     m_nPosition = end;
     m_nFileSize = std::max(m_nFileSize, end);
 }
@@ -116,7 +134,9 @@ ULONGLONG CMemFile::Seek(LONGLONG offset, UINT from) {
     return m_nPosition;
 }
 
-ULONGLONG CMemFile::GetLength() const { return m_nFileSize; }
+ULONGLONG CMemFile::GetLength() const {
+    return m_nFileSize;
+}
 
 void CMemFile::SetLength(ULONGLONG newLength) {
     if (newLength > std::numeric_limits<SIZE_T>::max())
@@ -130,20 +150,30 @@ void CMemFile::SetLength(ULONGLONG newLength) {
     m_nPosition = std::min(m_nPosition, size);
 }
 
-ULONGLONG CMemFile::GetPosition() const { return m_nPosition; }
+ULONGLONG CMemFile::GetPosition() const {
+    return m_nPosition;
+}
 
 void CMemFile::Flush() {}
 
-void CMemFile::Close() { FreeOwnBuffer(); }
+void CMemFile::Close() {
+    FreeOwnBuffer();
+}
 
-void CMemFile::Abort() { FreeOwnBuffer(); }
+void CMemFile::Abort() {
+    FreeOwnBuffer();
+}
 
 UINT CMemFile::GetBufferPtr(UINT command, UINT count, void** bufferStart, void** bufferMax) {
     switch (command) {
     case bufferCheck:
         return bufferDirect;
     case bufferCommit: {
-        SIZE_T end = std::min<SIZE_T>(m_nPosition + count, m_nBufferSize);
+        // Only room the buffer has can have been written; the position never
+        // moves backwards.
+        if (m_nPosition >= m_nBufferSize)
+            return 0;
+        SIZE_T end = m_nPosition + std::min<SIZE_T>(count, m_nBufferSize - m_nPosition);
         m_nPosition = end;
         m_nFileSize = std::max(m_nFileSize, end);
         return 0;

@@ -8,6 +8,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <functional>
 
 namespace vaskel {
 
@@ -40,9 +41,13 @@ Header* HeaderOf(const char* chars) {
     return reinterpret_cast<Header*>(const_cast<char*>(chars)) - 1;
 }
 
-char* EmptyChars() { return emptyBlock.header.chars(); }
+char* EmptyChars() {
+    return emptyBlock.header.chars();
+}
 
-bool IsEmptyBlock(const Header* header) { return header == &emptyBlock.header; }
+bool IsEmptyBlock(const Header* header) {
+    return header == &emptyBlock.header;
+}
 
 int ToLength(size_t value) {
     if (value > static_cast<size_t>(INT_MAX) - 64)
@@ -50,12 +55,20 @@ int ToLength(size_t value) {
     return static_cast<int>(value);
 }
 
-int SafeLength(const char* text) { return text ? ToLength(std::strlen(text)) : 0; }
+int SafeLength(const char* text) {
+    return text ? ToLength(std::strlen(text)) : 0;
+}
 
-char LowerAscii(char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c + ('a' - 'A')) : c; }
-char UpperAscii(char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - ('a' - 'A')) : c; }
+char LowerAscii(char c) {
+    return c >= 'A' && c <= 'Z' ? static_cast<char>(c + ('a' - 'A')) : c;
+}
+char UpperAscii(char c) {
+    return c >= 'a' && c <= 'z' ? static_cast<char>(c - ('a' - 'A')) : c;
+}
 
-bool InSet(const char* set, char c) { return c != '\0' && std::strchr(set, c) != nullptr; }
+bool InSet(const char* set, char c) {
+    return c != '\0' && std::strchr(set, c) != nullptr;
+}
 
 // The last byte of the room is always NUL, so a scan for the end of text that
 // a caller wrote through GetBuffer stops inside the block.
@@ -116,20 +129,23 @@ char* CString::PrepareWrite(int capacity) {
         m_pszData = copy;
         return m_pszData;
     }
-    // Sole owner: grow in place, geometrically so that appends stay linear.
+    // Sole owner: move to a larger block, geometrically so that appends stay
+    // linear. The whole old room is carried over: a buffer handed out by
+    // GetBuffer may hold characters beyond the length.
     if (capacity > INT_MAX - 64)
         AfxThrowMemoryException();
-    int grown = header->capacity + header->capacity / 2;
-    grown = std::max(capacity, std::min(grown, INT_MAX - 64));
-    long refs = header->refs.load(std::memory_order_relaxed);
-    void* block = std::realloc(header, sizeof(Header) + static_cast<size_t>(grown) + 1);
-    if (!block)
-        AfxThrowMemoryException();
-    header = static_cast<Header*>(block);
-    header->refs.store(refs, std::memory_order_relaxed);
-    header->capacity = grown;
-    header->chars()[grown] = '\0';
-    m_pszData = header->chars();
+    long long wanted = static_cast<long long>(header->capacity) + header->capacity / 2;
+    int grown =
+        static_cast<int>(std::max<long long>(capacity, std::min<long long>(wanted, INT_MAX - 64)));
+    char* moved = Allocate(grown);
+    std::memcpy(moved, m_pszData, static_cast<size_t>(header->capacity) + 1);
+    Header* movedHeader = HeaderOf(moved);
+    movedHeader->length = header->length;
+    movedHeader->refs.store(header->refs.load(std::memory_order_relaxed),
+                            std::memory_order_relaxed);
+    header->~Header();
+    std::free(header);
+    m_pszData = moved;
     return m_pszData;
 }
 
@@ -146,9 +162,13 @@ CString::CString(CString&& other) noexcept : m_pszData(other.m_pszData) {
     other.m_pszData = EmptyChars();
 }
 
-CString::CString(const char* text) : CString() { SetString(text); }
+CString::CString(const char* text) : CString() {
+    SetString(text);
+}
 
-CString::CString(const char* text, int length) : CString() { SetString(text, length); }
+CString::CString(const char* text, int length) : CString() {
+    SetString(text, length);
+}
 
 CString::CString(const unsigned char* text) : CString(reinterpret_cast<const char*>(text)) {}
 
@@ -174,13 +194,15 @@ CString::CString(const WCHAR* text, int length) : CString() {
         return;
     int bytes = WideCharToMultiByte(CP_ACP, 0, text, length, nullptr, 0, nullptr, nullptr);
     if (bytes <= 0)
-        return;
+        AfxThrowMemoryException(); // only a text too long for a CString fails here
     char* chars = PrepareWrite(bytes);
     WideCharToMultiByte(CP_ACP, 0, text, length, chars, bytes, nullptr, nullptr);
     SetLength(bytes);
 }
 
-CString::~CString() { Release(m_pszData); }
+CString::~CString() {
+    Release(m_pszData);
+}
 
 CString& CString::operator=(const CString& other) {
     if (m_pszData != other.m_pszData) {
@@ -211,11 +233,15 @@ CString& CString::operator=(const unsigned char* text) {
 }
 
 CString& CString::operator=(char ch) {
-    SetString(&ch, 1);
+    // As a one-character C string: NUL gives the empty string.
+    char text[2] = {ch, '\0'};
+    SetString(text);
     return *this;
 }
 
-CString& CString::operator=(const WCHAR* text) { return *this = CString(text); }
+CString& CString::operator=(const WCHAR* text) {
+    return *this = CString(text);
+}
 
 CString& CString::operator+=(const CString& text) {
     Append(text);
@@ -232,9 +258,13 @@ CString& CString::operator+=(char ch) {
     return *this;
 }
 
-int CString::GetLength() const noexcept { return HeaderOf(m_pszData)->length; }
+int CString::GetLength() const noexcept {
+    return HeaderOf(m_pszData)->length;
+}
 
-bool CString::IsEmpty() const noexcept { return HeaderOf(m_pszData)->length == 0; }
+bool CString::IsEmpty() const noexcept {
+    return HeaderOf(m_pszData)->length == 0;
+}
 
 void CString::Empty() noexcept {
     Release(m_pszData);
@@ -253,7 +283,9 @@ void CString::SetAt(int index, char ch) {
     PrepareWrite(GetLength())[index] = ch;
 }
 
-void CString::SetString(const char* text) { SetString(text, SafeLength(text)); }
+void CString::SetString(const char* text) {
+    SetString(text, SafeLength(text));
+}
 
 void CString::SetString(const char* text, int length) {
     if (!text || length <= 0) {
@@ -275,8 +307,9 @@ void CString::AppendOverlapSafe(const char* text, int length) {
     if (length > INT_MAX - 64 - old)
         AfxThrowMemoryException();
     const char* begin = m_pszData;
-    bool inside = text >= begin && text <= begin + old;
-    ptrdiff_t offset = text - begin;
+    std::less_equal<const char*> notAfter;
+    bool inside = notAfter(begin, text) && notAfter(text, begin + old);
+    ptrdiff_t offset = inside ? text - begin : 0;
     char* chars = PrepareWrite(old + length);
     if (inside)
         text = chars + offset;
@@ -292,7 +325,9 @@ void CString::Append(const CString& text) {
     AppendOverlapSafe(text.m_pszData, text.GetLength());
 }
 
-void CString::Append(const char* text) { AppendOverlapSafe(text, SafeLength(text)); }
+void CString::Append(const char* text) {
+    AppendOverlapSafe(text, SafeLength(text));
+}
 
 void CString::Append(const char* text, int length) {
     if (!text || length <= 0)
@@ -334,7 +369,9 @@ CString CString::Left(int count) const {
     return count == GetLength() ? *this : CString(m_pszData, count);
 }
 
-CString CString::Mid(int first) const { return Mid(first, INT_MAX); }
+CString CString::Mid(int first) const {
+    return Mid(first, INT_MAX);
+}
 
 CString CString::Mid(int first, int count) const {
     int length = GetLength();
@@ -411,8 +448,10 @@ int CString::ReverseFind(char ch) const {
 int CString::FindOneOf(const char* charSet) const {
     if (!charSet || *charSet == '\0')
         return -1;
+    // The scan stops at the first NUL, which may be an embedded one: it is
+    // not one of the characters looked for.
     size_t index = std::strcspn(m_pszData, charSet);
-    return index < static_cast<size_t>(GetLength()) ? static_cast<int>(index) : -1;
+    return m_pszData[index] != '\0' ? static_cast<int>(index) : -1;
 }
 
 CString& CString::MakeUpper() {
@@ -444,11 +483,19 @@ CString& CString::MakeReverse() {
     return *this;
 }
 
-CString& CString::Trim() { return TrimRight().TrimLeft(); }
-CString& CString::Trim(char target) { return TrimRight(target).TrimLeft(target); }
-CString& CString::Trim(const char* targets) { return TrimRight(targets).TrimLeft(targets); }
+CString& CString::Trim() {
+    return TrimRight().TrimLeft();
+}
+CString& CString::Trim(char target) {
+    return TrimRight(target).TrimLeft(target);
+}
+CString& CString::Trim(const char* targets) {
+    return TrimRight(targets).TrimLeft(targets);
+}
 
-CString& CString::TrimLeft() { return TrimLeft(whiteSpace); }
+CString& CString::TrimLeft() {
+    return TrimLeft(whiteSpace);
+}
 
 CString& CString::TrimLeft(char target) {
     char set[2] = {target, '\0'};
@@ -467,7 +514,9 @@ CString& CString::TrimLeft(const char* targets) {
     return *this;
 }
 
-CString& CString::TrimRight() { return TrimRight(whiteSpace); }
+CString& CString::TrimRight() {
+    return TrimRight(whiteSpace);
+}
 
 CString& CString::TrimRight(char target) {
     char set[2] = {target, '\0'};
@@ -541,7 +590,8 @@ int CString::Replace(const char* oldText, const char* newText) {
         size_t keep = static_cast<size_t>(p - in);
         std::memcpy(out, in, keep);
         out += keep;
-        std::memcpy(out, newText, static_cast<size_t>(newLength));
+        if (newLength > 0) // newText may be null: the match is removed
+            std::memcpy(out, newText, static_cast<size_t>(newLength));
         out += newLength;
         in = p + oldLength;
     }
@@ -562,7 +612,9 @@ int CString::Remove(char ch) {
     return length - kept;
 }
 
-int CString::Insert(int index, char ch) { return Insert(index, CString(ch, 1)); }
+int CString::Insert(int index, char ch) {
+    return Insert(index, CString(ch, 1));
+}
 
 int CString::Insert(int index, const char* text) {
     int length = GetLength();
@@ -623,7 +675,9 @@ void CString::AppendFormatV(const char* format, va_list args) {
     Append(formatted);
 }
 
-char* CString::GetBuffer() { return GetBuffer(0); }
+char* CString::GetBuffer() {
+    return GetBuffer(0);
+}
 
 char* CString::GetBuffer(int minBufferLength) {
     if (minBufferLength < 0)
@@ -647,8 +701,8 @@ void CString::ReleaseBuffer(int newLength) {
         return;
     if (newLength < 0) {
         const void* nul = std::memchr(m_pszData, '\0', static_cast<size_t>(data->capacity) + 1);
-        newLength = nul ? static_cast<int>(static_cast<const char*>(nul) - m_pszData)
-                        : data->capacity;
+        newLength =
+            nul ? static_cast<int>(static_cast<const char*>(nul) - m_pszData) : data->capacity;
     }
     newLength = std::min(newLength, data->capacity);
     SetLength(newLength);
@@ -673,17 +727,19 @@ void CString::FreeExtra() {
     Header* data = HeaderOf(m_pszData);
     if (IsEmptyBlock(data) || data->capacity == data->length)
         return;
+    if (data->refs.load(std::memory_order_acquire) != 1)
+        return; // shared or handed out: another owner may rely on the room
     if (data->length == 0) {
         Empty();
         return;
     }
-    if (data->refs.load(std::memory_order_acquire) != 1)
-        return; // shared or handed out: another owner may rely on the room
     CString compact(m_pszData, data->length);
     *this = std::move(compact);
 }
 
-int CString::GetAllocLength() const noexcept { return HeaderOf(m_pszData)->capacity; }
+int CString::GetAllocLength() const noexcept {
+    return HeaderOf(m_pszData)->capacity;
+}
 
 CString operator+(const CString& left, const CString& right) {
     CString result(left);

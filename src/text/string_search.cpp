@@ -9,7 +9,9 @@
 namespace vaskel {
 namespace {
 
-bool EqualBytes(char a, char b) { return a == b; }
+bool EqualBytes(char a, char b) {
+    return a == b;
+}
 
 bool EqualBytesNoCase(char a, char b) {
     return _mbctolower(static_cast<unsigned char>(a)) == _mbctolower(static_cast<unsigned char>(b));

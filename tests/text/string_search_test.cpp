@@ -37,7 +37,8 @@ TEST(VKFindStringNoCase, IgnoresCaseOfEitherSide) {
     const char* mixed = "xANDyandz";
     EXPECT_EQ(vaskel::VKFindStringNoCase(mixed, 9, "and", 3), mixed + 1);
     EXPECT_EQ(vaskel::VKFindStringNoCase(mixed, 9, "Q", 1), nullptr);
-    EXPECT_EQ(vaskel::VKFindStringNoCase(mixed, 3, "and", 3), nullptr) << "bounded like the plain form";
+    EXPECT_EQ(vaskel::VKFindStringNoCase(mixed, 3, "and", 3), nullptr)
+        << "bounded like the plain form";
 }
 
 TEST(VKSkipWhiteSpaces, StopsAtTheFirstOtherCharacterOrTheEnd) {

@@ -14,7 +14,15 @@ template <class TYPE, class ARG_TYPE = const TYPE&>
 class CList {
 public:
     CList() = default;
-    CList(const CList& other) { AddTail(&other); }
+    CList(const CList& other) {
+        // A constructor that throws runs no destructor: free what was copied.
+        try {
+            AddTail(&other);
+        } catch (...) {
+            RemoveAll();
+            throw;
+        }
+    }
     CList& operator=(const CList& other) {
         if (&other != this) {
             CList copy(other);

@@ -126,23 +126,59 @@ VASKEL_API CString operator+(const char* left, const CString& right);
 VASKEL_API CString operator+(const CString& left, char right);
 VASKEL_API CString operator+(char left, const CString& right);
 
-inline bool operator==(const CString& a, const CString& b) { return a.Compare(b) == 0; }
-inline bool operator==(const CString& a, const char* b) { return a.Compare(b) == 0; }
-inline bool operator==(const char* a, const CString& b) { return b.Compare(a) == 0; }
-inline bool operator!=(const CString& a, const CString& b) { return a.Compare(b) != 0; }
-inline bool operator!=(const CString& a, const char* b) { return a.Compare(b) != 0; }
-inline bool operator!=(const char* a, const CString& b) { return b.Compare(a) != 0; }
-inline bool operator<(const CString& a, const CString& b) { return a.Compare(b) < 0; }
-inline bool operator<(const CString& a, const char* b) { return a.Compare(b) < 0; }
-inline bool operator<(const char* a, const CString& b) { return b.Compare(a) > 0; }
-inline bool operator>(const CString& a, const CString& b) { return a.Compare(b) > 0; }
-inline bool operator>(const CString& a, const char* b) { return a.Compare(b) > 0; }
-inline bool operator>(const char* a, const CString& b) { return b.Compare(a) < 0; }
-inline bool operator<=(const CString& a, const CString& b) { return a.Compare(b) <= 0; }
-inline bool operator<=(const CString& a, const char* b) { return a.Compare(b) <= 0; }
-inline bool operator<=(const char* a, const CString& b) { return b.Compare(a) >= 0; }
-inline bool operator>=(const CString& a, const CString& b) { return a.Compare(b) >= 0; }
-inline bool operator>=(const CString& a, const char* b) { return a.Compare(b) >= 0; }
-inline bool operator>=(const char* a, const CString& b) { return b.Compare(a) <= 0; }
+inline bool operator==(const CString& a, const CString& b) {
+    return a.Compare(b) == 0;
+}
+inline bool operator==(const CString& a, const char* b) {
+    return a.Compare(b) == 0;
+}
+inline bool operator==(const char* a, const CString& b) {
+    return b.Compare(a) == 0;
+}
+inline bool operator!=(const CString& a, const CString& b) {
+    return a.Compare(b) != 0;
+}
+inline bool operator!=(const CString& a, const char* b) {
+    return a.Compare(b) != 0;
+}
+inline bool operator!=(const char* a, const CString& b) {
+    return b.Compare(a) != 0;
+}
+inline bool operator<(const CString& a, const CString& b) {
+    return a.Compare(b) < 0;
+}
+inline bool operator<(const CString& a, const char* b) {
+    return a.Compare(b) < 0;
+}
+inline bool operator<(const char* a, const CString& b) {
+    return b.Compare(a) > 0;
+}
+inline bool operator>(const CString& a, const CString& b) {
+    return a.Compare(b) > 0;
+}
+inline bool operator>(const CString& a, const char* b) {
+    return a.Compare(b) > 0;
+}
+inline bool operator>(const char* a, const CString& b) {
+    return b.Compare(a) < 0;
+}
+inline bool operator<=(const CString& a, const CString& b) {
+    return a.Compare(b) <= 0;
+}
+inline bool operator<=(const CString& a, const char* b) {
+    return a.Compare(b) <= 0;
+}
+inline bool operator<=(const char* a, const CString& b) {
+    return b.Compare(a) >= 0;
+}
+inline bool operator>=(const CString& a, const CString& b) {
+    return a.Compare(b) >= 0;
+}
+inline bool operator>=(const CString& a, const char* b) {
+    return a.Compare(b) >= 0;
+}
+inline bool operator>=(const char* a, const CString& b) {
+    return b.Compare(a) <= 0;
+}
 
 } // namespace vaskel

@@ -35,7 +35,9 @@ unsigned int ReadStatus() {
 
 } // namespace
 
-extern "C" unsigned int _statusfp(void) { return ReadStatus(); }
+extern "C" unsigned int _statusfp(void) {
+    return ReadStatus();
+}
 
 extern "C" unsigned int _clearfp(void) {
     unsigned int previous = ReadStatus();

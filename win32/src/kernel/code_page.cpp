@@ -3,6 +3,7 @@
 // Unicode standard recommends and Windows does.
 #include <vkwin32/kernel.h>
 
+#include <climits>
 #include <cstring>
 
 namespace {
@@ -58,17 +59,22 @@ bool DecodeUtf8(const unsigned char* text, int length, int& i, char32_t& cp) {
     return true;
 }
 
-int Utf16Units(char32_t cp) { return cp >= 0x10000 ? 2 : 1; }
+int Utf16Units(char32_t cp) {
+    return cp >= 0x10000 ? 2 : 1;
+}
 
 } // namespace
 
-extern "C" UINT WINAPI GetACP(void) { return CP_UTF8; }
+extern "C" UINT WINAPI GetACP(void) {
+    return CP_UTF8;
+}
 
 extern "C" int WINAPI MultiByteToWideChar(UINT codePage, DWORD flags, LPCSTR multiByteStr,
                                           int multiByteCount, LPWSTR wideCharStr,
                                           int wideCharCount) {
-    if (multiByteStr == nullptr || multiByteCount == 0 || multiByteCount < -1 ||
-        wideCharCount < 0 || (wideCharStr == nullptr && wideCharCount != 0) ||
+    // Any negative length means up to and including the NUL, as on Windows.
+    if (multiByteStr == nullptr || multiByteCount == 0 || wideCharCount < 0 ||
+        (wideCharStr == nullptr && wideCharCount != 0) ||
         static_cast<const void*>(multiByteStr) == static_cast<const void*>(wideCharStr) ||
         !IsUtf8CodePage(codePage)) {
         SetLastError(ERROR_INVALID_PARAMETER);
@@ -78,8 +84,12 @@ extern "C" int WINAPI MultiByteToWideChar(UINT codePage, DWORD flags, LPCSTR mul
         SetLastError(ERROR_INVALID_FLAGS);
         return 0;
     }
-    int length = multiByteCount == -1 ? static_cast<int>(std::strlen(multiByteStr)) + 1
-                                      : multiByteCount;
+    size_t measured = multiByteCount < 0 ? std::strlen(multiByteStr) + 1 : 0;
+    if (measured > static_cast<size_t>(INT_MAX)) {
+        SetLastError(ERROR_INVALID_PARAMETER);
+        return 0;
+    }
+    int length = multiByteCount < 0 ? static_cast<int>(measured) : multiByteCount;
     const auto* text = reinterpret_cast<const unsigned char*>(multiByteStr);
     int needed = 0;
     bool overflow = false;
@@ -116,11 +126,10 @@ extern "C" int WINAPI MultiByteToWideChar(UINT codePage, DWORD flags, LPCSTR mul
 }
 
 extern "C" int WINAPI WideCharToMultiByte(UINT codePage, DWORD flags, LPCWSTR wideCharStr,
-                                          int wideCharCount, LPSTR multiByteStr,
-                                          int multiByteCount, LPCSTR defaultChar,
-                                          LPBOOL usedDefaultChar) {
-    if (wideCharStr == nullptr || wideCharCount == 0 || wideCharCount < -1 ||
-        multiByteCount < 0 || (multiByteStr == nullptr && multiByteCount != 0) ||
+                                          int wideCharCount, LPSTR multiByteStr, int multiByteCount,
+                                          LPCSTR defaultChar, LPBOOL usedDefaultChar) {
+    if (wideCharStr == nullptr || wideCharCount == 0 || multiByteCount < 0 ||
+        (multiByteStr == nullptr && multiByteCount != 0) ||
         static_cast<const void*>(multiByteStr) == static_cast<const void*>(wideCharStr) ||
         !IsUtf8CodePage(codePage) ||
         (codePage == CP_UTF8 && (defaultChar != nullptr || usedDefaultChar != nullptr))) {
@@ -134,10 +143,15 @@ extern "C" int WINAPI WideCharToMultiByte(UINT codePage, DWORD flags, LPCWSTR wi
     if (usedDefaultChar)
         *usedDefaultChar = FALSE; // every character has a UTF-8 form
     int length = wideCharCount;
-    if (length == -1) {
+    if (length < 0) {
         length = 0;
-        while (wideCharStr[length] != 0)
+        while (wideCharStr[length] != 0) {
+            if (length == INT_MAX - 1) {
+                SetLastError(ERROR_INVALID_PARAMETER);
+                return 0;
+            }
             ++length;
+        }
         ++length;
     }
     int needed = 0;
@@ -174,6 +188,11 @@ extern "C" int WINAPI WideCharToMultiByte(UINT codePage, DWORD flags, LPCWSTR wi
             bytes[2] = static_cast<char>(0x80 | ((cp >> 6) & 0x3F));
             bytes[3] = static_cast<char>(0x80 | (cp & 0x3F));
             count = 4;
+        }
+        // Up to three bytes a unit can overflow the int count of a huge input.
+        if (needed > INT_MAX - count) {
+            SetLastError(ERROR_INSUFFICIENT_BUFFER);
+            return 0;
         }
         if (multiByteCount != 0) {
             if (needed + count > multiByteCount) {

@@ -50,9 +50,15 @@ FILETIME ToFileTime(const struct timespec& ts) {
     return ft;
 }
 
+// A file nobody may write is FILE_ATTRIBUTE_READONLY: it refuses writers and
+// deletion even where POSIX would let the caller through (root).
+bool IsReadOnly(const struct stat& st) {
+    return (st.st_mode & (S_IWUSR | S_IWGRP | S_IWOTH)) == 0;
+}
+
 DWORD AttributesOf(const struct stat& st) {
     DWORD attributes = S_ISDIR(st.st_mode) ? FILE_ATTRIBUTE_DIRECTORY : FILE_ATTRIBUTE_ARCHIVE;
-    if ((st.st_mode & (S_IWUSR | S_IWGRP | S_IWOTH)) == 0)
+    if (IsReadOnly(st))
         attributes |= FILE_ATTRIBUTE_READONLY;
     return attributes;
 }
@@ -89,20 +95,21 @@ extern "C" HANDLE WINAPI CreateFileA(LPCSTR fileName, DWORD desiredAccess, DWORD
     bool writable = flags != O_RDONLY;
     mode_t mode = (flagsAndAttributes & FILE_ATTRIBUTE_READONLY) ? 0444 : 0666;
 
+    // An existing file is truncated only after the checks below, so that a
+    // refused open leaves it intact.
     int fd = -1;
-    bool existed = false;
+    bool created = false;
     switch (creationDisposition) {
     case CREATE_NEW:
         fd = vkw32::OpenWithRetry(path, flags | O_CREAT | O_EXCL, mode);
+        created = fd >= 0;
         break;
     case CREATE_ALWAYS:
     case OPEN_ALWAYS:
         fd = vkw32::OpenWithRetry(path, flags | O_CREAT | O_EXCL, mode);
-        if (fd < 0 && errno == EEXIST) {
-            existed = true;
-            int truncate = creationDisposition == CREATE_ALWAYS && writable ? O_TRUNC : 0;
-            fd = vkw32::OpenWithRetry(path, flags | truncate, mode);
-        }
+        created = fd >= 0;
+        if (fd < 0 && errno == EEXIST)
+            fd = vkw32::OpenWithRetry(path, flags, mode);
         break;
     case OPEN_EXISTING:
         fd = vkw32::OpenWithRetry(path, flags, mode);
@@ -112,7 +119,7 @@ extern "C" HANDLE WINAPI CreateFileA(LPCSTR fileName, DWORD desiredAccess, DWORD
             SetLastError(ERROR_INVALID_PARAMETER);
             return INVALID_HANDLE_VALUE;
         }
-        fd = vkw32::OpenWithRetry(path, flags | O_TRUNC, mode);
+        fd = vkw32::OpenWithRetry(path, flags, mode);
         break;
     default:
         SetLastError(ERROR_INVALID_PARAMETER);
@@ -124,12 +131,24 @@ extern "C" HANDLE WINAPI CreateFileA(LPCSTR fileName, DWORD desiredAccess, DWORD
     }
     struct stat st;
     if (::fstat(fd, &st) != 0 ||
-        (S_ISDIR(st.st_mode) && !(flagsAndAttributes & FILE_FLAG_BACKUP_SEMANTICS))) {
+        (S_ISDIR(st.st_mode) && !(flagsAndAttributes & FILE_FLAG_BACKUP_SEMANTICS)) ||
+        (writable && !created && vkw32::IsReadOnly(st))) {
         ::close(fd);
         SetLastError(ERROR_ACCESS_DENIED);
         return INVALID_HANDLE_VALUE;
     }
+    bool truncate =
+        writable && !created && S_ISREG(st.st_mode) &&
+        (creationDisposition == CREATE_ALWAYS || creationDisposition == TRUNCATE_EXISTING);
+    if (truncate && ::ftruncate(fd, 0) != 0) {
+        int error = errno;
+        ::close(fd);
+        vkw32::SetLastErrorFromErrno(error);
+        return INVALID_HANDLE_VALUE;
+    }
     HANDLE handle = vkw32::InsertHandle(std::make_shared<FileObject>(fd));
+    bool existed =
+        !created && (creationDisposition == CREATE_ALWAYS || creationDisposition == OPEN_ALWAYS);
     SetLastError(existed ? ERROR_ALREADY_EXISTS : ERROR_SUCCESS);
     return handle;
 }
@@ -148,8 +167,8 @@ extern "C" BOOL WINAPI ReadFile(HANDLE file, LPVOID buffer, DWORD numberOfBytesT
     // A file read returns fewer bytes than asked only at the end of the file.
     DWORD total = 0;
     while (total < numberOfBytesToRead) {
-        ssize_t got = ::read(object->fd, static_cast<char*>(buffer) + total,
-                             numberOfBytesToRead - total);
+        ssize_t got =
+            ::read(object->fd, static_cast<char*>(buffer) + total, numberOfBytesToRead - total);
         if (got < 0 && errno == EINTR)
             continue;
         if (got < 0) {
@@ -273,6 +292,11 @@ extern "C" BOOL WINAPI FlushFileBuffers(HANDLE file) {
     auto object = vkw32::LookupHandleAs<FileObject>(file);
     if (!object)
         return FALSE;
+    // Windows flushes only through a handle with write access.
+    if ((::fcntl(object->fd, F_GETFL) & O_ACCMODE) == O_RDONLY) {
+        SetLastError(ERROR_ACCESS_DENIED);
+        return FALSE;
+    }
     if (::fsync(object->fd) != 0 && errno != EINVAL) {
         vkw32::SetLastErrorFromErrno(errno);
         return FALSE;
@@ -318,7 +342,7 @@ extern "C" BOOL WINAPI DeleteFileA(LPCSTR fileName) {
     if (!vkw32::ToPosixPath(fileName, path))
         return FALSE;
     struct stat st;
-    if (::lstat(path.c_str(), &st) == 0 && S_ISDIR(st.st_mode)) {
+    if (::lstat(path.c_str(), &st) == 0 && (S_ISDIR(st.st_mode) || vkw32::IsReadOnly(st))) {
         SetLastError(ERROR_ACCESS_DENIED);
         return FALSE;
     }
@@ -349,7 +373,10 @@ extern "C" BOOL WINAPI MoveFileA(LPCSTR existingFileName, LPCSTR newFileName) {
             SetLastError(ERROR_ALREADY_EXISTS);
             return FALSE;
         }
-        vkw32::SetPathError(error, from);
+        // With the source present, a missing path is the target's directory.
+        struct stat st;
+        bool sourceExists = error == ENOENT && ::lstat(from.c_str(), &st) == 0;
+        vkw32::SetPathError(error, sourceExists ? to : from);
         return FALSE;
     }
     return TRUE;

@@ -50,7 +50,9 @@ std::shared_ptr<KernelObject> RemoveHandle(HANDLE handle) {
     return object;
 }
 
-void SetInvalidHandleError() { SetLastError(ERROR_INVALID_HANDLE); }
+void SetInvalidHandleError() {
+    SetLastError(ERROR_INVALID_HANDLE);
+}
 
 } // namespace vkw32
 

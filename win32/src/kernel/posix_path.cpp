@@ -77,6 +77,8 @@ DWORD ErrorFromErrno(int error) {
     }
 }
 
-void SetLastErrorFromErrno(int error) { SetLastError(ErrorFromErrno(error)); }
+void SetLastErrorFromErrno(int error) {
+    SetLastError(ErrorFromErrno(error));
+}
 
 } // namespace vkw32

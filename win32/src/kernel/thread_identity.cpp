@@ -10,4 +10,6 @@ extern "C" DWORD WINAPI GetCurrentThreadId(void) {
     return id;
 }
 
-extern "C" DWORD WINAPI GetCurrentProcessId(void) { return static_cast<DWORD>(::getpid()); }
+extern "C" DWORD WINAPI GetCurrentProcessId(void) {
+    return static_cast<DWORD>(::getpid());
+}

@@ -36,6 +36,13 @@ const char* const fileMessages[] = {
     "An attempt was made to read past the end of the file.",
 };
 
+CString WithFileName(const char* message, const CString& fileName) {
+    CString text(message);
+    if (!fileName.IsEmpty())
+        text.AppendFormat(" (%s)", fileName.GetString());
+    return text;
+}
+
 template <size_t N>
 const char* MessageOf(const char* const (&messages)[N], int cause) {
     return cause >= 0 && static_cast<size_t>(cause) < N ? messages[cause] : messages[1];
@@ -89,10 +96,7 @@ const char* CArchiveException::what() const noexcept {
 }
 
 CString CArchiveException::GetErrorMessage() const {
-    CString message(what());
-    if (!m_strFileName.IsEmpty())
-        message.AppendFormat(" (%s)", m_strFileName.GetString());
-    return message;
+    return WithFileName(what(), m_strFileName);
 }
 
 CFileException::CFileException(int cause, LONG osError, const char* fileName)
@@ -103,10 +107,7 @@ const char* CFileException::what() const noexcept {
 }
 
 CString CFileException::GetErrorMessage() const {
-    CString message(what());
-    if (!m_strFileName.IsEmpty())
-        message.AppendFormat(" (%s)", m_strFileName.GetString());
-    return message;
+    return WithFileName(what(), m_strFileName);
 }
 
 int CFileException::OsErrorToException(LONG osError) {

@@ -4,5 +4,7 @@
 #include "crt.h"
 #include "interlocked.h"
 #include "kernel.h"
+#include "mmsystem.h"
+#include "synch.h"
 #include "types.h"
 #include "winerror.h"

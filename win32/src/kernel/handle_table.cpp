@@ -1,6 +1,9 @@
 #include "handle_table.h"
 
+#include "thread.h"
+
 #include <vkwin32/kernel.h>
+#include <vkwin32/synch.h>
 
 #include <mutex>
 #include <unordered_map>
@@ -33,6 +36,8 @@ HANDLE InsertHandle(std::shared_ptr<KernelObject> object) {
 }
 
 std::shared_ptr<KernelObject> LookupHandle(HANDLE handle) {
+    if (handle == GetCurrentThread())
+        return CurrentThreadObject();
     HandleTable& table = Table();
     std::lock_guard<std::mutex> lock(table.mutex);
     auto it = table.objects.find(reinterpret_cast<std::uintptr_t>(handle));
@@ -56,7 +61,48 @@ void SetInvalidHandleError() {
 
 } // namespace vkw32
 
+namespace {
+
+bool IsPseudoHandle(HANDLE handle) {
+    return handle == GetCurrentProcess() || handle == GetCurrentThread();
+}
+
+} // namespace
+
+extern "C" HANDLE WINAPI GetCurrentProcess(void) {
+    return reinterpret_cast<HANDLE>(static_cast<LONG_PTR>(-1));
+}
+
+extern "C" BOOL WINAPI DuplicateHandle(HANDLE sourceProcess, HANDLE sourceHandle,
+                                       HANDLE targetProcess, LPHANDLE targetHandle,
+                                       DWORD /*desiredAccess*/, BOOL /*inheritHandle*/,
+                                       DWORD options) {
+    // Only this process exists here.
+    if (sourceProcess != GetCurrentProcess() || targetProcess != GetCurrentProcess()) {
+        SetLastError(ERROR_INVALID_HANDLE);
+        return FALSE;
+    }
+    std::shared_ptr<vkw32::KernelObject> object = vkw32::LookupHandle(sourceHandle);
+    if (options & DUPLICATE_CLOSE_SOURCE && !IsPseudoHandle(sourceHandle))
+        vkw32::RemoveHandle(sourceHandle);
+    if (!object) {
+        SetLastError(ERROR_INVALID_HANDLE);
+        return FALSE;
+    }
+    if (targetHandle == nullptr) {
+        if (options & DUPLICATE_CLOSE_SOURCE)
+            return TRUE;
+        SetLastError(ERROR_INVALID_PARAMETER);
+        return FALSE;
+    }
+    *targetHandle = vkw32::InsertHandle(std::move(object));
+    return TRUE;
+}
+
 extern "C" BOOL WINAPI CloseHandle(HANDLE object) {
+    // Closing a pseudo-handle does nothing and succeeds, as on Windows.
+    if (IsPseudoHandle(object))
+        return TRUE;
     // The object itself is released outside the table's lock: closing a file
     // may block.
     std::shared_ptr<vkw32::KernelObject> removed = vkw32::RemoveHandle(object);

@@ -8,6 +8,7 @@
 #include <vaskel/queue.h>
 #include <vaskel/sync.h>
 #include <vaskel/text.h>
+#include <vaskel/timer.h>
 #include <vaskel/value.h>
 
 #include <cstdio>
@@ -143,6 +144,30 @@ void TourValuesAndText() {
     std::printf("copied into 6 bytes: '%s'\n", buffer);
 }
 
+void TourTimers() {
+    Section("Stopwatches and timers");
+    CVKTimer timer(20, tuMilliseconds);
+    std::printf("a 20 ms timer not yet started has %u ms remaining\n",
+                static_cast<unsigned>(timer.GetRemainingTime(tuMilliseconds)));
+    CVKStopWatch watch(true);
+    timer.Start(true);
+    while (!timer.TimeoutExpired())
+        Sleep(1);
+    watch.Stop();
+    std::printf("once it has expired it has %u ms remaining\n",
+                static_cast<unsigned>(timer.GetRemainingTime(tuMilliseconds)));
+    std::printf("a stopwatch started before it read at least 20 ms: %s\n",
+                watch.GetReading(tuMilliseconds) >= 20.0 ? "yes" : "no");
+    std::printf("a stopped stopwatch has no sample reading: %.1f\n",
+                watch.GetSampleReading(tuMilliseconds));
+    COperationStatistic parse("parse", tuMilliseconds);
+    parse.LogExecution(4);
+    parse.LogExecution(2);
+    std::printf("'%s' logged %u times: fastest %.0f ms, slowest %.0f ms, on average %.0f ms\n",
+                parse.m_strName.GetString(), static_cast<unsigned>(parse.m_nCount),
+                parse.m_dMinimum, parse.m_dMaximum, parse.m_dAverage);
+}
+
 } // namespace
 
 int main() {
@@ -153,5 +178,6 @@ int main() {
     TourCommands();
     TourLifetime();
     TourValuesAndText();
+    TourTimers();
     return 0;
 }

@@ -49,6 +49,20 @@ TEST(CVKStopWatch, ResumesAccumulatesAndRestartsFromZero) {
     EXPECT_EQ(watch.GetReading(tuTicks), 0.0);
 }
 
+TEST(CVKStopWatch, ReadingsNeverGoBackwards) {
+    CVKStopWatch watch(true);
+    CVKQuickStopWatch quick;
+    double last = 0.0, lastQuick = 0.0;
+    for (int i = 0; i < 20000; ++i) {
+        double reading = watch.GetSampleReading(tuMicroseconds);
+        double quickReading = quick.GetReading(tuTicks);
+        ASSERT_GE(reading, last);
+        ASSERT_GE(quickReading, lastQuick);
+        last = reading;
+        lastQuick = quickReading;
+    }
+}
+
 TEST(CVKStopWatch, StartWithoutResetLeavesARunningWatchAlone) {
     CVKStopWatch watch(true);
     Sleep(10);

@@ -1,5 +1,7 @@
 // Code-page conversions as Windows documents them; the same tests run against
 // the system on Windows.
+#include "support/wine.h"
+
 #include <vaskel/win32.h>
 
 #include <gtest/gtest.h>
@@ -42,14 +44,7 @@ DWORD ErrorOf(int result) {
 
 // Wine 8 skips some documented checks: it splits a surrogate pair to fill a
 // buffer and, with CP_UTF8, ignores other flags and converts in place.
-bool RunningOnWine() {
-#ifdef _WIN32
-    HMODULE ntdll = GetModuleHandleA("ntdll.dll");
-    return ntdll != nullptr && GetProcAddress(ntdll, "wine_get_version") != nullptr;
-#else
-    return false;
-#endif
-}
+using vaskel_test::RunningOnWine;
 
 TEST(CodePageTest, RoundTripsEveryUtf8Length) {
     // The first and last code point of each length, an embedded NUL and mixed text.

@@ -42,6 +42,7 @@ typedef std::uintptr_t UINT_PTR;
 typedef std::intptr_t LONG_PTR;
 typedef std::uintptr_t ULONG_PTR;
 typedef std::uintptr_t DWORD_PTR;
+typedef DWORD_PTR* PDWORD_PTR;
 typedef std::size_t SIZE_T;
 typedef std::ptrdiff_t SSIZE_T;
 

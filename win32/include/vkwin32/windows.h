@@ -7,4 +7,5 @@
 #include "mmsystem.h"
 #include "synch.h"
 #include "types.h"
+#include "user.h"
 #include "winerror.h"

@@ -18,7 +18,7 @@ public:
     DWORD exitCode = STILL_ACTIVE;
     DWORD suspendCount = 0;
     bool started = false;
-    std::condition_variable stateChanged; // start and resume handshakes
+    std::condition_variable_any stateChanged; // start and resume handshakes
 
 private:
     bool m_finished = false;

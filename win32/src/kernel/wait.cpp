@@ -7,8 +7,8 @@
 namespace vkw32 {
 namespace {
 
-std::mutex& WaitLock() {
-    static std::mutex* lock = new std::mutex; // outlives every static destructor
+AdaptiveMutex& WaitLock() {
+    static auto* lock = new AdaptiveMutex; // outlives every static destructor
     return *lock;
 }
 
@@ -18,6 +18,20 @@ const std::shared_ptr<WakeSignal>& ThisThreadSignal() {
 }
 
 } // namespace
+
+AdaptiveMutex::AdaptiveMutex() {
+    pthread_mutexattr_t attributes;
+    pthread_mutexattr_init(&attributes);
+    pthread_mutexattr_settype(&attributes, PTHREAD_MUTEX_ADAPTIVE_NP);
+    pthread_mutex_init(&m_mutex, &attributes);
+    pthread_mutexattr_destroy(&attributes);
+}
+
+AdaptiveMutex::~AdaptiveMutex() { pthread_mutex_destroy(&m_mutex); }
+
+void AdaptiveMutex::lock() { pthread_mutex_lock(&m_mutex); }
+
+void AdaptiveMutex::unlock() { pthread_mutex_unlock(&m_mutex); }
 
 void WakeSignal::Wake() {
     {
@@ -47,25 +61,35 @@ void KernelLock::WakeLater(const std::shared_ptr<WakeSignal>& signal) {
 bool Waiter::TrySatisfy() {
     if (done)
         return false;
-    if (waitAll) {
+    if (waitAll && count > 0) {
+        // All objects, and with an input object also new input, as the
+        // platform documents for message waits.
         for (DWORD i = 0; i < count; ++i)
             if (!objects[i]->IsSignaled())
                 return false;
+        if (input && !(input->WakeBits() & inputMask))
+            return false;
         for (DWORD i = 0; i < count; ++i)
             objects[i]->Acquire();
         result = WAIT_OBJECT_0;
-    } else {
-        // The lowest index among the signalled objects, as Windows reports it.
-        DWORD i = 0;
-        while (i < count && !objects[i]->IsSignaled())
-            ++i;
-        if (i == count)
-            return false;
-        objects[i]->Acquire();
-        result = WAIT_OBJECT_0 + i;
+        done = true;
+        return true;
     }
-    done = true;
-    return true;
+    // The lowest index among the signalled objects, as Windows reports it.
+    for (DWORD i = 0; i < count; ++i) {
+        if (objects[i]->IsSignaled()) {
+            objects[i]->Acquire();
+            result = WAIT_OBJECT_0 + i;
+            done = true;
+            return true;
+        }
+    }
+    if (input && (input->WakeBits() & inputMask)) {
+        result = WAIT_OBJECT_0 + count;
+        done = true;
+        return true;
+    }
+    return false;
 }
 
 void Waitable::Signaled(KernelLock& lock) {
@@ -77,12 +101,20 @@ void Waitable::Signaled(KernelLock& lock) {
     }
 }
 
+void Waitable::RemoveWaiter(Waiter* waiter) {
+    m_waiters.erase(std::find(m_waiters.begin(), m_waiters.end(), waiter));
+}
+
 DWORD WaitForObjects(const std::shared_ptr<Waitable>* objects, DWORD count, bool waitAll,
-                     DWORD milliseconds) {
-    std::array<Waitable*, MAXIMUM_WAIT_OBJECTS> raw;
+                     DWORD milliseconds, Waitable* input, DWORD inputMask) {
+    std::array<Waitable*, MAXIMUM_WAIT_OBJECTS + 1> raw;
     for (DWORD i = 0; i < count; ++i)
         raw[i] = objects[i].get();
-    Waiter waiter(raw.data(), count, waitAll);
+    Waiter waiter(raw.data(), count, waitAll, input, inputMask);
+    // The input object is watched like the others.
+    DWORD watched = count;
+    if (input)
+        raw[watched++] = input;
     const std::shared_ptr<WakeSignal>& signal = ThisThreadSignal();
     waiter.signal = signal;
     auto deadline = std::chrono::steady_clock::now() + std::chrono::milliseconds(milliseconds);
@@ -92,8 +124,8 @@ DWORD WaitForObjects(const std::shared_ptr<Waitable>* objects, DWORD count, bool
             return waiter.result;
         if (milliseconds == 0)
             return WAIT_TIMEOUT;
-        for (DWORD i = 0; i < count; ++i)
-            raw[i]->m_waiters.push_back(&waiter);
+        for (DWORD i = 0; i < watched; ++i)
+            raw[i]->AddWaiter(&waiter);
     }
     for (;;) {
         {
@@ -108,23 +140,19 @@ DWORD WaitForObjects(const std::shared_ptr<Waitable>* objects, DWORD count, bool
         KernelLock lock;
         bool expired = milliseconds != INFINITE && std::chrono::steady_clock::now() >= deadline;
         if (waiter.done || expired) {
-            for (DWORD i = 0; i < count; ++i) {
-                auto& list = raw[i]->m_waiters;
-                list.erase(std::find(list.begin(), list.end(), &waiter));
-            }
+            for (DWORD i = 0; i < watched; ++i)
+                raw[i]->RemoveWaiter(&waiter);
             return waiter.done ? waiter.result : WAIT_TIMEOUT;
         }
     }
 }
 
-namespace {
-
-DWORD WaitOnHandles(DWORD count, const HANDLE* handles, bool waitAll, DWORD milliseconds) {
-    if (count == 0 || count > MAXIMUM_WAIT_OBJECTS || handles == nullptr) {
+DWORD ResolveWaitHandles(DWORD count, const HANDLE* handles, bool waitAll,
+                         std::shared_ptr<Waitable>* objects) {
+    if (count > 0 && handles == nullptr) {
         SetLastError(ERROR_INVALID_PARAMETER);
         return WAIT_FAILED;
     }
-    std::array<std::shared_ptr<Waitable>, MAXIMUM_WAIT_OBJECTS> objects;
     for (DWORD i = 0; i < count; ++i) {
         objects[i] = std::dynamic_pointer_cast<Waitable>(LookupHandle(handles[i]));
         if (!objects[i]) {
@@ -132,12 +160,24 @@ DWORD WaitOnHandles(DWORD count, const HANDLE* handles, bool waitAll, DWORD mill
             return WAIT_FAILED;
         }
         // One object twice in a wait for all could never be taken twice.
-        if (waitAll &&
-            std::find(objects.begin(), objects.begin() + i, objects[i]) != objects.begin() + i) {
+        if (waitAll && std::find(objects, objects + i, objects[i]) != objects + i) {
             SetLastError(ERROR_INVALID_PARAMETER);
             return WAIT_FAILED;
         }
     }
+    return WAIT_OBJECT_0;
+}
+
+namespace {
+
+DWORD WaitOnHandles(DWORD count, const HANDLE* handles, bool waitAll, DWORD milliseconds) {
+    if (count == 0 || count > MAXIMUM_WAIT_OBJECTS) {
+        SetLastError(ERROR_INVALID_PARAMETER);
+        return WAIT_FAILED;
+    }
+    std::array<std::shared_ptr<Waitable>, MAXIMUM_WAIT_OBJECTS> objects;
+    if (ResolveWaitHandles(count, handles, waitAll, objects.data()) == WAIT_FAILED)
+        return WAIT_FAILED;
     return WaitForObjects(objects.data(), count, waitAll, milliseconds);
 }
 

@@ -15,6 +15,7 @@
 #include <condition_variable>
 #include <memory>
 #include <mutex>
+#include <pthread.h>
 #include <vector>
 
 namespace vkw32 {
@@ -31,6 +32,21 @@ struct WakeSignal {
     bool woken = false;
 };
 
+// The wait lock: held briefly and often by every thread that posts, sends or
+// waits, so a contender spins a little before it sleeps.
+class AdaptiveMutex {
+public:
+    AdaptiveMutex();
+    ~AdaptiveMutex();
+    AdaptiveMutex(const AdaptiveMutex&) = delete;
+    AdaptiveMutex& operator=(const AdaptiveMutex&) = delete;
+    void lock();
+    void unlock();
+
+private:
+    pthread_mutex_t m_mutex;
+};
+
 // Holds the wait lock; wakes the waiters satisfied meanwhile on release.
 class KernelLock {
 public:
@@ -40,25 +56,30 @@ public:
     KernelLock& operator=(const KernelLock&) = delete;
 
     void WakeLater(const std::shared_ptr<WakeSignal>& signal);
-    std::unique_lock<std::mutex>& Lock() { return m_lock; }
+    std::unique_lock<AdaptiveMutex>& Lock() { return m_lock; }
 
 private:
-    std::unique_lock<std::mutex> m_lock;
+    std::unique_lock<AdaptiveMutex> m_lock;
     std::shared_ptr<WakeSignal> m_first; // almost always the only one
     std::vector<std::shared_ptr<WakeSignal>> m_more;
 };
 
 struct Waiter {
-    Waiter(Waitable* const* objects, DWORD count, bool waitAll)
-        : objects(objects), count(count), waitAll(waitAll) {}
+    Waiter(Waitable* const* objects, DWORD count, bool waitAll, Waitable* input, DWORD inputMask)
+        : objects(objects), count(count), waitAll(waitAll), input(input), inputMask(inputMask) {}
 
     // Under the wait lock: when the wait can be satisfied now, takes the
-    // objects it needs and records the result.
+    // objects it needs and records the result. Waiting for any: the objects
+    // come first, new input of the watched kinds is the alternative (result
+    // count). Waiting for all: every object and, with an input object, new
+    // input too.
     bool TrySatisfy();
 
     Waitable* const* objects;
     DWORD count;
     bool waitAll;
+    Waitable* input;
+    DWORD inputMask;
     bool done = false;
     DWORD result = WAIT_TIMEOUT;
     std::shared_ptr<WakeSignal> signal;
@@ -71,19 +92,30 @@ public:
     // A satisfied wait takes the object; auto-reset objects become
     // non-signalled by it.
     virtual void Acquire() {}
+    // The kinds of input that arrived since the owner last looked (QS_ bits);
+    // only message queues have any.
+    virtual DWORD WakeBits() const { return 0; }
+
+    // Under the wait lock, by the waiting thread.
+    void AddWaiter(Waiter* waiter) { m_waiters.push_back(waiter); }
+    void RemoveWaiter(Waiter* waiter);
 
 protected:
     // Hands the object, newly signalled, to the waiters it can satisfy.
     void Signaled(KernelLock& lock);
 
 private:
-    friend DWORD WaitForObjects(const std::shared_ptr<Waitable>* objects, DWORD count, bool waitAll,
-                                DWORD milliseconds);
     std::vector<Waiter*> m_waiters;
 };
 
-// The wait itself; objects are kept alive by the caller's references.
+// The wait itself; objects are kept alive by the caller's references. With
+// an input object, new input of the kinds in inputMask also ends the wait.
 DWORD WaitForObjects(const std::shared_ptr<Waitable>* objects, DWORD count, bool waitAll,
-                     DWORD milliseconds);
+                     DWORD milliseconds, Waitable* input = nullptr, DWORD inputMask = 0);
+
+// Resolves handles for a wait: WAIT_OBJECT_0 when all are waitable, else
+// WAIT_FAILED with the last error set.
+DWORD ResolveWaitHandles(DWORD count, const HANDLE* handles, bool waitAll,
+                         std::shared_ptr<Waitable>* objects);
 
 } // namespace vkw32

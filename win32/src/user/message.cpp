@@ -238,11 +238,16 @@ extern "C" BOOL WINAPI PeekMessageA(LPMSG message, HWND window, UINT filterMin, 
         return FALSE;
     }
     const std::shared_ptr<vkw32::MessageQueue>& own = vkw32::CurrentQueue();
-    vkw32::ProcessSentMessages(own);
-    KernelLock lock;
-    own->changedBits = 0;
-    return vkw32::TakePosted(*own, window, filterMin, filterMax, (removeMessage & PM_REMOVE) != 0,
-                             message);
+    for (;;) {
+        vkw32::ProcessSentMessages(own);
+        KernelLock lock;
+        // A message sent meanwhile is handled before the input counts as seen.
+        if (!own->sent.empty())
+            continue;
+        own->changedBits = 0;
+        return vkw32::TakePosted(*own, window, filterMin, filterMax,
+                                 (removeMessage & PM_REMOVE) != 0, message);
+    }
 }
 
 extern "C" BOOL WINAPI TranslateMessage(const MSG* /*message*/) {

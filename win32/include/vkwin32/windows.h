@@ -5,6 +5,7 @@
 #include "interlocked.h"
 #include "kernel.h"
 #include "mmsystem.h"
+#include "objbase.h"
 #include "synch.h"
 #include "types.h"
 #include "user.h"

@@ -1,0 +1,36 @@
+// A thread's COM apartment: entered by the first initialisation, counted by
+// the following ones, left when the count returns to zero.
+#include <vkwin32/objbase.h>
+
+namespace {
+
+struct Apartment {
+    unsigned count = 0;
+    bool multithreaded = false;
+};
+
+thread_local Apartment apartment;
+
+} // namespace
+
+extern "C" HRESULT WINAPI CoInitializeEx(LPVOID /*reserved*/, DWORD coInit) {
+    bool multithreaded = (coInit & COINIT_APARTMENTTHREADED) == 0;
+    if (apartment.count > 0) {
+        if (apartment.multithreaded != multithreaded)
+            return RPC_E_CHANGED_MODE;
+        ++apartment.count;
+        return S_FALSE;
+    }
+    apartment.count = 1;
+    apartment.multithreaded = multithreaded;
+    return S_OK;
+}
+
+extern "C" HRESULT WINAPI CoInitialize(LPVOID reserved) {
+    return CoInitializeEx(reserved, COINIT_APARTMENTTHREADED);
+}
+
+extern "C" void WINAPI CoUninitialize(void) {
+    if (apartment.count > 0)
+        --apartment.count;
+}

@@ -12,6 +12,7 @@
 #include <vaskel/value.h>
 
 #include <cstdio>
+#include <thread>
 
 using namespace vaskel;
 
@@ -168,6 +169,60 @@ void TourTimers() {
                 parse.m_dMinimum, parse.m_dMaximum, parse.m_dAverage);
 }
 
+// Answers on the thread that created it: a posted number is remembered, a
+// sent one is doubled.
+struct DoublingWnd : CVKMsgWnd {
+    bool OnWndMsg(UINT message, WPARAM wParam, LPARAM lParam, LRESULT* result) override {
+        if (message == WM_USER) {
+            posted = static_cast<int>(wParam);
+            onOwnThread = IsInThreadCtx();
+            SetEvent(handled);
+            *result = 0;
+            return true;
+        }
+        if (message == WM_USER + 1) {
+            *result = static_cast<LRESULT>(wParam * 2);
+            return true;
+        }
+        return CVKMsgWnd::OnWndMsg(message, wParam, lParam, result);
+    }
+    HANDLE handled = nullptr;
+    int posted = 0;
+    bool onOwnThread = false;
+};
+
+void TourMessageWindow() {
+    Section("Message windows");
+    CVKEvent created, handled;
+    DoublingWnd window;
+    window.handled = handled;
+    DWORD ownerId = 0;
+    std::thread owner([&] {
+        ownerId = GetCurrentThreadId();
+        window.Create();
+        created.SetEvent();
+        MSG msg;
+        while (GetMessageA(&msg, nullptr, 0, 0) > 0)
+            DispatchMessageA(&msg);
+    });
+    created.Lock(INFINITE);
+    std::printf("a window created on another thread; asked from here, in its thread: %s\n",
+                window.IsInThreadCtx() ? "yes" : "no");
+    window.PostMessageA(WM_USER, 7, 0);
+    // Waiting keeps this thread's own messages moving too.
+    WaitOnHandleWithMessageLoop(handled, INFINITE, false);
+    std::printf("the posted 7 was handled on the window's thread: %s\n",
+                window.posted == 7 && window.onOwnThread ? "yes" : "no");
+    const LRESULT doubled = ::SendMessageA(window.GetWndHandle(), WM_USER + 1, 21, 0);
+    std::printf("sent 21 and got back %d once the window's thread had answered\n",
+                static_cast<int>(doubled));
+    window.Destroy();
+    std::printf("destroyed from here: the object lets go at once, created %s\n",
+                window.Created() ? "yes" : "no");
+    PostThreadMessageA(ownerId, WM_QUIT, 0, 0);
+    owner.join();
+}
+
 } // namespace
 
 int main() {
@@ -176,6 +231,7 @@ int main() {
     TourArchive();
     TourDiagnostics();
     TourCommands();
+    TourMessageWindow();
     TourLifetime();
     TourValuesAndText();
     TourTimers();

@@ -1,11 +1,20 @@
 #include "module_lifetime.h"
 
 #include "../diag/debug_conditions.h"
+#include "../sync/message_loop_wait.h"
+
+#include <vaskel/queue.h>
 
 namespace vaskel {
 
-void ModuleStartup() {}
+void ModuleStartup() {
+    // A refusal is not fatal: the first window to be created tries again.
+    CVKMsgWnd::GetMsgWndClassName();
+    RegisterAbortWaitingLoopMessage();
+}
 
-void ModuleShutdown() { ReleaseDebugConditions(); }
+void ModuleShutdown() {
+    ReleaseDebugConditions();
+}
 
 } // namespace vaskel

@@ -30,15 +30,6 @@ BOOL Post(KernelLock& lock, MessageQueue& queue, const MSG& msg) {
     return TRUE;
 }
 
-// The procedure of the window whose message this thread took last, so that
-// dispatching it needs no lock while no window's procedure has changed.
-struct DispatchCache {
-    HWND window = nullptr;
-    WNDPROC procedure = nullptr;
-    unsigned generation = 0;
-};
-thread_local DispatchCache dispatchCache;
-
 bool Matches(const MSG& msg, HWND window, UINT filterMin, UINT filterMax) {
     // WM_QUIT is always retrieved, whatever the filter.
     if (msg.message == WM_QUIT)
@@ -61,11 +52,8 @@ bool TakePosted(MessageQueue& queue, HWND window, UINT filterMin, UINT filterMax
                 queue.posted.pop_front();
             else if (remove)
                 queue.posted.erase(it);
-            unsigned generation = WindowGeneration();
-            bool cached =
-                out->hwnd == dispatchCache.window && dispatchCache.generation == generation;
-            if (Window* target = out->hwnd && !cached ? FindWindow(out->hwnd) : nullptr)
-                dispatchCache = {out->hwnd, target->procedure, generation};
+            if (out->hwnd && !CachedWindow(out->hwnd))
+                RememberWindow(*FindWindow(out->hwnd));
             return true;
         }
     }
@@ -161,6 +149,9 @@ using vkw32::KernelLock;
 extern "C" BOOL WINAPI PostThreadMessageA(DWORD threadId, UINT message, WPARAM wParam,
                                           LPARAM lParam) {
     MSG msg = vkw32::MakeMessage(nullptr, message, wParam, lParam);
+    // Like any call of the window services, it gives the caller a queue.
+    if (threadId == GetCurrentThreadId())
+        vkw32::CurrentQueue();
     KernelLock lock;
     std::shared_ptr<vkw32::MessageQueue> queue = vkw32::QueueOfThread(threadId);
     if (!queue) {
@@ -257,9 +248,8 @@ extern "C" BOOL WINAPI TranslateMessage(const MSG* /*message*/) {
 extern "C" LRESULT WINAPI DispatchMessageA(const MSG* message) {
     if (message == nullptr || message->hwnd == nullptr)
         return 0;
-    const vkw32::DispatchCache& cache = vkw32::dispatchCache;
-    if (message->hwnd == cache.window && cache.generation == vkw32::WindowGeneration())
-        return CallWindowProcA(cache.procedure, message->hwnd, message->message, message->wParam,
+    if (const vkw32::WindowCache* cached = vkw32::CachedWindow(message->hwnd))
+        return CallWindowProcA(cached->procedure, message->hwnd, message->message, message->wParam,
                                message->lParam);
     WNDPROC procedure;
     {

@@ -89,6 +89,20 @@ Window* FindWindow(HWND handle);
 unsigned WindowGeneration();
 void WindowsChanged();
 
+// What this thread last learnt of the window whose message it took, so that
+// dispatching the next one and reading its identifier need no lock while no
+// window has changed.
+struct WindowCache {
+    HWND window = nullptr;
+    WNDPROC procedure = nullptr;
+    LONG_PTR id = 0;
+    unsigned generation = 0;
+};
+// The cache when it is still good for this window, else null.
+const WindowCache* CachedWindow(HWND window);
+// Under the lock.
+void RememberWindow(const Window& window);
+
 // Runs the messages other threads have sent to this thread, in order.
 void ProcessSentMessages(const std::shared_ptr<MessageQueue>& queue);
 

@@ -1,6 +1,8 @@
 // Window classes and (invisible) windows.
 #include "window_table.h"
 
+#include "../kernel/hot_tls.h"
+
 #include <algorithm>
 #include <atomic>
 #include <cstring>
@@ -82,6 +84,20 @@ void WindowsChanged() {
     generation.fetch_add(1, std::memory_order_acq_rel);
 }
 
+namespace {
+VKW32_HOT_TLS thread_local WindowCache windowCache;
+}
+
+const WindowCache* CachedWindow(HWND window) {
+    return window == windowCache.window && windowCache.generation == WindowGeneration()
+               ? &windowCache
+               : nullptr;
+}
+
+void RememberWindow(const Window& window) {
+    windowCache = {window.handle, window.procedure, window.id, WindowGeneration()};
+}
+
 HWND InsertWindow(const std::shared_ptr<Window>& window) {
     UserTables& tables = Tables();
     window->handle = reinterpret_cast<HWND>(tables.nextWindow);
@@ -91,7 +107,13 @@ HWND InsertWindow(const std::shared_ptr<Window>& window) {
 }
 
 void RemoveWindow(HWND handle) {
-    Tables().windows.erase(reinterpret_cast<ULONG_PTR>(handle));
+    auto& windows = Tables().windows;
+    auto it = windows.find(reinterpret_cast<ULONG_PTR>(handle));
+    if (it == windows.end())
+        return;
+    it->second->queue->DiscardMessagesOf(handle);
+    windows.erase(it);
+    WindowsChanged();
 }
 
 Window* FindWindow(HWND handle) {
@@ -271,6 +293,12 @@ extern "C" DWORD WINAPI GetWindowThreadProcessId(HWND handle, LPDWORD processId)
 }
 
 extern "C" LONG_PTR WINAPI GetWindowLongPtrA(HWND handle, int index) {
+    if (const vkw32::WindowCache* cached = vkw32::CachedWindow(handle)) {
+        if (index == GWLP_ID)
+            return cached->id;
+        if (index == GWLP_WNDPROC)
+            return reinterpret_cast<LONG_PTR>(cached->procedure);
+    }
     KernelLock lock;
     Window* window = vkw32::FindWindow(handle);
     if (!window)
@@ -313,6 +341,8 @@ extern "C" LONG_PTR WINAPI SetWindowLongPtrA(HWND handle, int index, LONG_PTR ne
     }
     previous = *slot;
     *slot = newLong;
+    if (index == GWLP_ID)
+        vkw32::WindowsChanged();
     return previous;
 }
 

@@ -41,6 +41,19 @@ bool TryTake(LPCRITICAL_SECTION section) {
                                        __ATOMIC_ACQUIRE, __ATOMIC_RELAXED);
 }
 
+// Sections guard short regions: a contender that waits briefly usually gets
+// the lock without sleeping.
+bool SpinToTake(LPCRITICAL_SECTION section) {
+    for (int i = 0; i < 200; ++i) {
+        if (__atomic_load_n(&section->LockCount, __ATOMIC_RELAXED) == freeState && TryTake(section))
+            return true;
+#if defined(__x86_64__) || defined(__i386__)
+        __builtin_ia32_pause();
+#endif
+    }
+    return false;
+}
+
 } // namespace
 
 extern "C" void WINAPI InitializeCriticalSection(LPCRITICAL_SECTION section) {
@@ -58,7 +71,7 @@ extern "C" void WINAPI EnterCriticalSection(LPCRITICAL_SECTION section) {
         ++section->RecursionCount;
         return;
     }
-    if (!TryTake(section)) {
+    if (!TryTake(section) && !SpinToTake(section)) {
         // Mark the lock contended, so that its owner wakes a waiter on leaving.
         while (__atomic_exchange_n(&section->LockCount, contendedState, __ATOMIC_ACQUIRE) !=
                freeState)

@@ -1,7 +1,9 @@
+#include "hot_tls.h"
+
 #include <vkwin32/kernel.h>
 
 namespace {
-thread_local DWORD lastError = ERROR_SUCCESS;
+VKW32_HOT_TLS thread_local DWORD lastError = ERROR_SUCCESS;
 }
 
 extern "C" DWORD WINAPI GetLastError(void) {

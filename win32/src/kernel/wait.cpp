@@ -27,11 +27,17 @@ AdaptiveMutex::AdaptiveMutex() {
     pthread_mutexattr_destroy(&attributes);
 }
 
-AdaptiveMutex::~AdaptiveMutex() { pthread_mutex_destroy(&m_mutex); }
+AdaptiveMutex::~AdaptiveMutex() {
+    pthread_mutex_destroy(&m_mutex);
+}
 
-void AdaptiveMutex::lock() { pthread_mutex_lock(&m_mutex); }
+void AdaptiveMutex::lock() {
+    pthread_mutex_lock(&m_mutex);
+}
 
-void AdaptiveMutex::unlock() { pthread_mutex_unlock(&m_mutex); }
+void AdaptiveMutex::unlock() {
+    pthread_mutex_unlock(&m_mutex);
+}
 
 void WakeSignal::Wake() {
     {

@@ -1,5 +1,6 @@
 #include "message_queue.h"
 
+#include "../kernel/hot_tls.h"
 #include "../kernel/thread.h"
 #include "window_table.h"
 
@@ -41,7 +42,7 @@ struct QueueHolder {
     }
 };
 
-thread_local QueueHolder currentQueue;
+VKW32_HOT_TLS thread_local QueueHolder currentQueue;
 
 } // namespace
 

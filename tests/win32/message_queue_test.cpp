@@ -75,6 +75,15 @@ TEST(MessageQueueTest, PostingToAThreadWithoutQueueOrThatEndedFails) {
     EXPECT_EQ(GetLastError(), expected);
 }
 
+TEST(MessageQueueTest, AThreadPostingToItselfGetsAQueue) {
+    std::thread fresh([] {
+        EXPECT_TRUE(PostThreadMessageA(GetCurrentThreadId(), WM_USER, 0, 0));
+        MSG msg;
+        EXPECT_EQ(Next(msg), static_cast<UINT>(WM_USER));
+    });
+    fresh.join();
+}
+
 TEST(MessageQueueTest, FiltersSelectByNumber) {
     EnsureQueue();
     DWORD self = GetCurrentThreadId();

@@ -1,6 +1,7 @@
 #include "module_lifetime.h"
 
 #include "../diag/debug_conditions.h"
+#include "../queue/queue_thread_startup.h"
 #include "../sync/message_loop_wait.h"
 
 #include <vaskel/queue.h>
@@ -8,12 +9,14 @@
 namespace vaskel {
 
 void ModuleStartup() {
+    CreateQueueThreadStartup();
     // A refusal is not fatal: the first window to be created tries again.
     CVKMsgWnd::GetMsgWndClassName();
     RegisterAbortWaitingLoopMessage();
 }
 
 void ModuleShutdown() {
+    ReleaseQueueThreadStartup();
     ReleaseDebugConditions();
 }
 

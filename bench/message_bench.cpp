@@ -5,6 +5,8 @@
 //           std::deque + std::condition_variable queue doing the same
 //   Send    a cross-thread SendMessageA round trip; against a
 //           condition-variable ping-pong
+#include "ping_pong.h"
+
 #include <vaskel/win32.h>
 
 #include <benchmark/benchmark.h>
@@ -128,35 +130,7 @@ void BM_Send_Window(benchmark::State& state) {
 }
 
 void BM_Send_ConditionVariable(benchmark::State& state) {
-    std::mutex mutex;
-    std::condition_variable changed;
-    bool request = false, reply = false, stop = false;
-    long value = 0;
-    std::thread partner([&] {
-        std::unique_lock<std::mutex> lock(mutex);
-        for (;;) {
-            changed.wait(lock, [&] { return request || stop; });
-            if (stop)
-                return;
-            request = false;
-            ++value;
-            reply = true;
-            changed.notify_all();
-        }
-    });
-    for (auto _ : state) {
-        std::unique_lock<std::mutex> lock(mutex);
-        request = true;
-        changed.notify_all();
-        changed.wait(lock, [&] { return reply; });
-        reply = false;
-    }
-    {
-        std::lock_guard<std::mutex> lock(mutex);
-        stop = true;
-    }
-    changed.notify_all();
-    partner.join();
+    ConditionVariablePingPong(state);
 }
 
 BENCHMARK(BM_Send_Window)->UseRealTime();

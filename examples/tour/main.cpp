@@ -225,6 +225,33 @@ void TourMessageWindow() {
 
 } // namespace
 
+struct CountCmd : CVKAsyncCmd {
+    CountCmd(CVKAsyncCmdQueueThread& queue, int* count) : queue(queue), count(count) {}
+    void Execute() override {
+        ++*count; // runs on the queue thread, one command at a time
+        onQueueThread = queue.IsInThreadCtx();
+    }
+    CVKAsyncCmdQueueThread& queue;
+    int* count;
+    bool onQueueThread = false;
+};
+
+void TourCommandQueue() {
+    Section("Command queues");
+    CVKAsyncCmdQueueThread worker(2);
+    worker.Create();
+    int count = 0;
+    CountCmd first(worker, &count);
+    worker.SendCmd(first); // returns once it has run
+    std::printf("a synchronous send ran on the queue thread: %s\n",
+                first.onQueueThread ? "yes" : "no");
+    for (int i = 0; i < 100; ++i)
+        worker.QueueCmd(new CountCmd(worker, &count), i % 2);
+    worker.Destroy(false); // lets what was queued run, then stops the thread
+    std::printf("commands run before shut-down: %d; the thread is alive: %s\n", count,
+                worker.IsAlive() ? "yes" : "no");
+}
+
 int main() {
     std::printf("vaskel tour\n");
     TourStrings();
@@ -232,6 +259,7 @@ int main() {
     TourDiagnostics();
     TourCommands();
     TourMessageWindow();
+    TourCommandQueue();
     TourLifetime();
     TourValuesAndText();
     TourTimers();

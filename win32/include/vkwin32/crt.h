@@ -5,6 +5,13 @@
 
 #include "types.h"
 
+#include <cstddef>
+
+typedef int errno_t;
+
+// The buffer size that holds any fixed-point conversion of a double.
+#define _CVTBUFSIZE (309 + 40)
+
 #define _SW_INEXACT 0x00000001
 #define _SW_UNDERFLOW 0x00000002
 #define _SW_OVERFLOW 0x00000004
@@ -18,6 +25,12 @@ unsigned int _statusfp(void);
 unsigned int _clearfp(void);
 
 unsigned int _mbctolower(unsigned int c);
+
+// The digits of the value rounded to count fractional digits (halves away
+// from zero), without sign, point or leading zeros; *decimalPoint is the
+// number of those digits before the point (negative: zeros after it).
+errno_t _fcvt_s(char* buffer, size_t sizeInBytes, double value, int count, int* decimalPoint,
+                int* sign);
 unsigned int _mbctoupper(unsigned int c);
 
 } // extern "C"

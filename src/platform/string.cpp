@@ -658,14 +658,19 @@ void CString::AppendFormat(const char* format, ...) {
 void CString::AppendFormatV(const char* format, va_list args) {
     if (!format)
         AfxThrowInvalidArgException();
+    // Most texts fit a small buffer and need a single pass; a longer one is
+    // measured by that pass and formatted again into its own room.
+    char small[256];
     va_list measure;
     va_copy(measure, args);
-    int needed = std::vsnprintf(nullptr, 0, format, measure);
+    int needed = std::vsnprintf(small, sizeof small, format, measure);
     va_end(measure);
     if (needed < 0)
         AfxThrowInvalidArgException();
-    if (needed == 0)
+    if (needed < static_cast<int>(sizeof small)) {
+        AppendOverlapSafe(small, needed);
         return;
+    }
     // The arguments may point into this string's own buffer, so the text is
     // formatted into a new buffer and then appended.
     CString formatted;

@@ -1,0 +1,40 @@
+// The conversions allocate nothing beyond their result string. This program
+// counts every operator new; CString's own buffer is the only allocation a
+// conversion may make, and a string with room needs none.
+#include <vaskel/text.h>
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <cstdlib>
+#include <new>
+
+namespace {
+std::atomic<long> allocations{0};
+}
+
+void* operator new(std::size_t size) {
+    ++allocations;
+    if (void* block = std::malloc(size ? size : 1))
+        return block;
+    throw std::bad_alloc();
+}
+void operator delete(void* block) noexcept {
+    std::free(block);
+}
+void operator delete(void* block, std::size_t) noexcept {
+    std::free(block);
+}
+
+TEST(ConversionAllocation, ConvertingIntoAStringWithRoomAllocatesNothing) {
+    vaskel::CString out;
+    vaskel::VKReserveStringBuffer(out, 512);
+    long before = allocations;
+    vaskel::AsString(out, 1.1);
+    vaskel::AsString(out, 12345.678, 3);
+    vaskel::AsString(out, 1.1f);
+    vaskel::AsString(out, -42);
+    vaskel::AsString(out, reinterpret_cast<void*>(&out));
+    EXPECT_EQ(allocations - before, 0);
+    EXPECT_STREQ(out.Left(0), "");
+}

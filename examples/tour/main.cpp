@@ -1,4 +1,5 @@
 // A tour of vaskel: each family at work, printing what it did.
+#include <vaskel/calendar.h>
 #include <vaskel/diag.h>
 #include <vaskel/framework/archive.h>
 #include <vaskel/framework/array.h>
@@ -252,6 +253,22 @@ void TourCommandQueue() {
                 worker.IsAlive() ? "yes" : "no");
 }
 
+void TourConversionsAndSpans() {
+    Section("Conversions and time spans");
+    std::printf("1.1 as text: %s; 2.5 with no digits: %s; 0.05: %s; 1.1f: %s\n",
+                AsString(1.1).GetString(), AsString(2.5, 0).GetString(), AsString(0.05).GetString(),
+                AsString(1.1f).GetString());
+    std::printf("'  yes' reads as %s, '12abc' as %d\n", AsBool("  yes") ? "true" : "false",
+                AsInteger("12abc", 5));
+    CTimeSpan span(1, 2, 30, 15, 250);
+    std::printf("a span of 1 day 2 h 30 min 15.25 s: '%s', or '%s' remaining, '%s' to the minute\n",
+                span.ToString().GetString(), span.ToStringAsTimeRemaining().GetString(),
+                span.ToStringAsTimeRemaining(Minutes).GetString());
+    DaysOfWeek days;
+    days.FromString("mon, fri");
+    std::printf("'mon, fri' as days of the week: %s\n", days.ToString().GetString());
+}
+
 int main() {
     std::printf("vaskel tour\n");
     TourStrings();
@@ -262,6 +279,7 @@ int main() {
     TourCommandQueue();
     TourLifetime();
     TourValuesAndText();
+    TourConversionsAndSpans();
     TourTimers();
     return 0;
 }

@@ -6,6 +6,7 @@
 #include "types.h"
 
 #include <cstddef>
+#include <ctime>
 
 typedef int errno_t;
 
@@ -32,5 +33,8 @@ unsigned int _mbctolower(unsigned int c);
 errno_t _fcvt_s(char* buffer, size_t sizeInBytes, double value, int count, int* decimalPoint,
                 int* sign);
 unsigned int _mbctoupper(unsigned int c);
+
+// The local-time breakdown of a calendar time; EINVAL when it has none.
+errno_t localtime_s(struct tm* result, const time_t* time);
 
 } // extern "C"

@@ -64,6 +64,9 @@ extern "C" {
 DWORD WINAPI GetCurrentThreadId(void);
 DWORD WINAPI GetCurrentProcessId(void);
 
+// Only the program itself (a null name) is a module here.
+HMODULE WINAPI GetModuleHandleA(LPCSTR moduleName);
+
 DWORD WINAPI GetLastError(void);
 void WINAPI SetLastError(DWORD errorCode);
 

@@ -147,4 +147,7 @@ UINT WINAPI RegisterWindowMessageA(LPCSTR name);
 DWORD WINAPI MsgWaitForMultipleObjects(DWORD count, const HANDLE* handles, BOOL waitAll,
                                        DWORD milliseconds, DWORD wakeMask);
 
+// Programs carry no string resources here: every lookup fails.
+int WINAPI LoadStringA(HINSTANCE instance, UINT id, LPSTR buffer, int bufferMax);
+
 } // extern "C"

@@ -1,5 +1,6 @@
-// Calendar vocabulary: months, weekdays and time resolutions, value wrappers
-// with their English names, and a set of weekdays.
+// Calendar and time: months, weekdays and time resolutions with their
+// English names, sets of weekdays, time spans, dates, times of day and
+// date-times on the variant-time scale (days since 30 December 1899).
 #pragma once
 
 #include <vaskel/export.h>
@@ -9,6 +10,9 @@
 #include <type_traits>
 
 namespace vaskel {
+
+class CArchive;
+class CDateTime;
 
 // A fixed int underlying type makes every int a valid value, so the wrappers
 // below can hold whatever int they are given without undefined behaviour.
@@ -184,6 +188,11 @@ struct VASKEL_API DayOfWeekX : public CVKEnumHelper<EDayOfWeek> {
     static EDayOfWeek First() { return Sunday; }
     static EDayOfWeek Last() { return Saturday; }
     static EDayOfWeek Next(EDayOfWeek day);
+
+    // The weekday of a day number: day 1 (31 December 1899) is a Sunday.
+    static EDayOfWeek FromJulianDate(DWORD date);
+    // Today's weekday in local time.
+    static EDayOfWeek TodaysDay();
 
     // The day whose full or three-letter name is the whole text, ignoring
     // case; the invalid day for anything else or a null pointer.
@@ -400,6 +409,284 @@ private:
     static double Rounded(double days);
 
     double m_span;
+};
+
+class CTime;
+
+// A date without a time of day: the whole-day part of a variant time, kept
+// as an unsigned 32-bit day number (0 is 30 December 1899 and the null date).
+class VASKEL_API CJulianDate {
+public:
+    CJulianDate() : m_date(0) {}
+    CJulianDate(DWORD date) : m_date(date) {}
+    CJulianDate(const CDateTime& dateTime);
+    // Year, month (1-12), day; the date stays 0 when the conversion rejects it.
+    CJulianDate(int year, int month, int day);
+
+    CJulianDate& operator=(DWORD date) {
+        m_date = date;
+        return *this;
+    }
+    void SetValue(DWORD date) { m_date = date; }
+    // The variant time truncated toward zero, as its low 32 bits.
+    bool SetDate(double variantTime);
+    bool SetDate(int year, int month, int day);
+    bool FromSystemTime(const SYSTEMTIME& time);
+
+    bool IsNull() const { return m_date == 0; }
+    void SetNull() { m_date = 0; }
+    DWORD GetValue() const { return m_date; }
+    operator DWORD() const { return m_date; }
+
+    CDateTime ToDateTime() const;
+    // These throw unexpected_error when the day has no calendar date.
+    SYSTEMTIME ToSystemTime() const;
+    DWORD GetYear() const;
+    DWORD GetMonth() const;
+    DWORD GetDay() const;
+    ECalendarMonth GetCalendarMonth() const;
+
+    static CJulianDate Now();
+    void SetNow();
+
+    void AddDays(int days);
+    // Months and years keep the day, except that February takes its last
+    // day when the day is beyond it; they throw unexpected_error when the
+    // day has no calendar date.
+    void AddMonths(int months);
+    void AddYears(int years);
+
+    // A part day of the span is dropped.
+    CJulianDate& operator+=(const CTimeSpan& span);
+    CDateTime operator+(const CTimeSpan& span) const;
+    CDateTime operator+(const CTime& time) const;
+    CTimeSpan operator-(const CJulianDate& other) const;
+
+    bool operator==(const CJulianDate& other) const { return m_date == other.m_date; }
+    bool operator!=(const CJulianDate& other) const { return m_date != other.m_date; }
+    bool operator<(const CJulianDate& other) const { return m_date < other.m_date; }
+    bool operator==(DWORD date) const { return m_date == date; }
+    bool operator!=(DWORD date) const { return m_date != date; }
+    bool operator<(DWORD date) const { return m_date < date; }
+
+    // The date at 00:00 in the text forms of CDateTime.
+    CString Format(DWORD flags, LCID locale) const;
+    CString Format(const char* format) const;
+    CString Format(UINT formatId) const;
+    CString ToString() const;
+
+    bool ParseDate(const char* text, DWORD flags, LCID locale);
+    bool FromString(const char* text);
+    // Throws unexpected_error when the text is not a date.
+    static CJulianDate Parse(const char* text, DWORD flags, LCID locale);
+
+private:
+    DWORD m_date;
+};
+
+// A point in time as one variant time: whole days since 30 December 1899,
+// the fraction the time of day. For a negative value the date is the
+// truncation and the time of day the absolute value of the fraction.
+class VASKEL_API CDateTime {
+public:
+    CDateTime() : m_value(0.0) {}
+    CDateTime(double value) : m_value(value) {}
+    CDateTime(int year, int month, int day, int hour, int minute, int second);
+    CDateTime(const SYSTEMTIME& time);
+
+    CDateTime& operator=(double value) {
+        m_value = value;
+        return *this;
+    }
+    void SetValue(double value) { m_value = value; }
+    double GetValue() const { return m_value; }
+    operator double() const { return m_value; }
+    double& GetValueRef() { return m_value; }
+
+    bool IsNull() const { return m_value == 0.0; }
+    void SetNull() { m_value = 0.0; }
+
+    LONG GetDatePortion() const;
+    double GetTimePortion() const;
+    void SetDatePortion(LONG date);
+    void SetTimePortion(double time);
+    void SetDateOnly();
+    void ClearTimePortion() { SetDateOnly(); }
+    void SetTimeOnly();
+    void ClearDatePortion() { SetTimeOnly(); }
+
+    DWORD GetJulianDate() const { return GetJulianDate(m_value); }
+    static DWORD GetJulianDate(double value);
+    void SetJulianDate(DWORD date) { m_value = static_cast<double>(date); }
+
+    // 0-1439 for values of 0 and above.
+    int GetMinuteOfTheDay() const { return GetMinuteOfTheDay(m_value); }
+    static int GetMinuteOfTheDay(double value);
+    EDayOfWeek GetDayOfTheWeek() const;
+
+    // These throw unexpected_error when the value has no calendar date.
+    DWORD GetYear() const;
+    DWORD GetMonth() const;
+    DWORD GetDay() const;
+    DWORD GetHour() const;
+    DWORD GetMinute() const;
+    DWORD GetSecond() const;
+    DWORD GetMilliseconds() const;
+    ECalendarMonth GetCalendarMonth() const;
+
+    static bool IsLeapYear(DWORD year);
+    static unsigned char DaysInMonth(DWORD year, ECalendarMonth month);
+    // Zero-based month; 0 days for any other month number.
+    static unsigned char DaysInMonth(DWORD year, int month);
+    static unsigned char DaysInMonthOneBased(DWORD year, int month);
+
+    // The setters keep the value when the conversion rejects the fields.
+    bool SetDate(int year, int month, int day);
+    bool SetDateTime(int year, int month, int day, int hour, int minute, int second);
+    // Leaves a time-only value.
+    bool SetTime(int hour, int minute, int second);
+    bool FromSystemTime(const SYSTEMTIME& time);
+    bool ToSystemTime(SYSTEMTIME& time) const;
+    SYSTEMTIME ToSystemTime() const;
+
+    // Local time in whole seconds; 0.0 when the clock has no local time.
+    static CDateTime Now();
+    void SetNow() { *this = Now(); }
+    static CDateTime NowDateOnly();
+    void SetNowDateOnly() { *this = NowDateOnly(); }
+    static CDateTime NowTimeOnly();
+    void SetNowtimeOnly() { *this = NowTimeOnly(); }
+
+    CDateTime operator+(const CTimeSpan& span) const { return CDateTime(m_value + span.GetSpan()); }
+    CDateTime operator-(const CTimeSpan& span) const { return CDateTime(m_value - span.GetSpan()); }
+    CDateTime& operator+=(const CTimeSpan& span) {
+        m_value += span.GetSpan();
+        return *this;
+    }
+    CDateTime& operator-=(const CTimeSpan& span) {
+        m_value -= span.GetSpan();
+        return *this;
+    }
+    // Rounded to whole milliseconds.
+    CTimeSpan operator-(const CDateTime& other) const { return CTimeSpan(m_value - other.m_value); }
+
+    void AddDays(int days) { m_value += days; }
+    void AddMinutes(int minutes);
+    void AddSeconds(int seconds);
+    // Keep the time of day; February takes its last day when the day is
+    // beyond it, other months keep the day as it is. They throw
+    // unexpected_error when the value has no calendar date.
+    void AddMonths(int months);
+    void AddYears(int years);
+
+    bool operator==(const CDateTime& other) const { return m_value == other.m_value; }
+    bool operator!=(const CDateTime& other) const { return m_value != other.m_value; }
+    bool operator<(const CDateTime& other) const { return m_value < other.m_value; }
+    bool operator==(double value) const { return m_value == value; }
+    bool operator!=(double value) const { return m_value != value; }
+    bool operator<(double value) const { return m_value < value; }
+    int Compare(double value) const;
+    // Values less than a millisecond apart compare equal.
+    static int CompareToMilisecondResolution(double a, double b);
+
+    // The platform's text of the value in the locale.
+    CString Format(DWORD flags, LCID locale) const;
+    // The user's default locale, no flags.
+    CString ToString() const;
+    // strftime-style codes "aAbBcdHIjmMpSUwWxXyYzZ%", each with an optional
+    // '#' that drops leading zeros (long forms for c and x).
+    CString Format(const char* format) const;
+    // The format is the program's string resource; COleException(E_FAIL)
+    // when there is none.
+    CString Format(UINT formatId) const;
+    static bool ValidFormatString(const char* format);
+    // The empty string when the format is not valid.
+    CString TryFormat(const char* format) const;
+
+    // The value changes only when the text parses.
+    bool ParseDateTime(const char* text, DWORD flags, LCID locale);
+    bool FromString(const char* text);
+
+private:
+    double m_value;
+};
+
+// The archive form is the value as a little-endian IEEE double.
+VASKEL_API CArchive& operator<<(CArchive& archive, const CDateTime& dateTime);
+VASKEL_API CArchive& operator>>(CArchive& archive, CDateTime& dateTime);
+
+// A time of day as a fraction of a day, 0.0 being midnight and null. Most
+// operations keep the fraction's sign (a plain fraction); the setters and
+// the in-place shifts wrap a negative one into [0, 1).
+class VASKEL_API CTime {
+public:
+    CTime() : m_value(0.0) {}
+    CTime(double value);
+    CTime(const CDateTime& dateTime);
+    // The value stays 0.0 when the conversion rejects the fields.
+    CTime(int hour, int minute, int second);
+    CTime(const SYSTEMTIME& time);
+
+    // Stores the number as it is, date part included.
+    CTime& operator=(double value) {
+        m_value = value;
+        return *this;
+    }
+    void SetValue(double value);
+    bool SetTime(int hour, int minute, int second);
+    bool FromSystemTime(const SYSTEMTIME& time);
+
+    bool IsNull() const { return m_value == 0.0; }
+    void SetNull() { m_value = 0.0; }
+    double GetValue() const { return m_value; }
+    operator double() const { return m_value; }
+    double& GetValueRef() { return m_value; }
+
+    static CTime Now();
+    void SetNow() { *this = Now(); }
+    CDateTime ToDateTime() const { return CDateTime(m_value); }
+
+    // These throw unexpected_error as CDateTime's do.
+    DWORD GetHour() const { return ToDateTime().GetHour(); }
+    DWORD GetMinute() const { return ToDateTime().GetMinute(); }
+    DWORD GetSecond() const { return ToDateTime().GetSecond(); }
+    DWORD GetMilliseconds() const { return ToDateTime().GetMilliseconds(); }
+    SYSTEMTIME ToSystemTime() const { return ToDateTime().ToSystemTime(); }
+    int GetMinuteOfTheDay() const { return CDateTime::GetMinuteOfTheDay(m_value); }
+    static int GetMinuteOfTheDay(double value) { return CDateTime::GetMinuteOfTheDay(value); }
+
+    // Wrap around midnight in both directions.
+    void AddSeconds(int seconds);
+    void AddMinutes(int minutes);
+
+    CTime operator+(const CTimeSpan& span) const { return CTime(m_value + span.GetSpan()); }
+    CTime operator-(const CTimeSpan& span) const { return CTime(m_value - span.GetSpan()); }
+    CTime& operator+=(const CTimeSpan& span);
+    CTime& operator-=(const CTimeSpan& span);
+    CDateTime operator+(const CJulianDate& date) const;
+    // Rounded to whole milliseconds.
+    CTimeSpan operator-(const CTime& other) const { return CTimeSpan(m_value - other.m_value); }
+
+    bool operator==(const CTime& other) const { return m_value == other.m_value; }
+    bool operator!=(const CTime& other) const { return m_value != other.m_value; }
+    bool operator<(const CTime& other) const { return m_value < other.m_value; }
+    bool operator==(double value) const { return m_value == value; }
+    bool operator!=(double value) const { return m_value != value; }
+    bool operator<(double value) const { return m_value < value; }
+    int Compare(double value) const { return ToDateTime().Compare(value); }
+
+    // The value formatted as a date-time: date codes show 30 December 1899.
+    CString Format(DWORD flags, LCID locale) const { return ToDateTime().Format(flags, locale); }
+    CString Format(const char* format) const { return ToDateTime().Format(format); }
+    CString Format(UINT formatId) const { return ToDateTime().Format(formatId); }
+    CString ToString() const { return ToDateTime().ToString(); }
+
+    // Keeps the time of day of the parsed date-time.
+    bool ParseTime(const char* text, DWORD flags, LCID locale);
+    bool FromString(const char* text);
+
+private:
+    double m_value;
 };
 
 } // namespace vaskel

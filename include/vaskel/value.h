@@ -1,4 +1,4 @@
-// Values: colours.
+// Values: colours and rectangles.
 #pragma once
 
 #include <vaskel/export.h>
@@ -6,6 +6,8 @@
 #include <vaskel/win32.h>
 
 namespace vaskel {
+
+class CArchive;
 
 // A colour as 0x00BBGGRR: red in bits 0-7, green 8-15, blue 16-23.
 class VASKEL_API CRGBColor {
@@ -43,5 +45,17 @@ public:
 private:
     DWORD m_color;
 };
+
+// A rectangle in floating-point coordinates.
+struct CVKRectF {
+    double left;
+    double top;
+    double right;
+    double bottom;
+};
+
+// The archive holds top, bottom, left, right, each a little-endian double.
+VASKEL_API CArchive& operator<<(CArchive& archive, const CVKRectF& rect);
+VASKEL_API CArchive& operator>>(CArchive& archive, CVKRectF& rect);
 
 } // namespace vaskel

@@ -1,6 +1,6 @@
-# Script mode: runs PROGRAM (through EMULATOR when set) and compares what it
-# prints with the file EXPECTED, ignoring carriage returns.
-execute_process(COMMAND ${EMULATOR} ${PROGRAM}
+# Script mode: runs PROGRAM (through EMULATOR when set) with ARGS and compares
+# what it prints with the file EXPECTED, ignoring carriage returns.
+execute_process(COMMAND ${EMULATOR} ${PROGRAM} ${ARGS}
     OUTPUT_VARIABLE output RESULT_VARIABLE result)
 if(NOT result EQUAL 0)
     message(FATAL_ERROR "${PROGRAM} exited with ${result}")

@@ -269,7 +269,40 @@ void TourConversionsAndSpans() {
     std::printf("'mon, fri' as days of the week: %s\n", days.ToString().GetString());
 }
 
-int main() {
+// Today, or the date-time given on the command line (the pinned output
+// uses one so that it stays the same every day).
+void TourDatesAndTimes(const char* today) {
+    Section("Dates and times");
+    CDateTime now = CDateTime::Now();
+    if (today && !now.FromString(today))
+        std::printf("'%s' is not a date-time; showing today\n", today);
+    std::printf("today is %s: %s; the date alone %s; the time alone %s\n",
+                DayOfWeekX::ToString(now.GetDayOfTheWeek(), true), now.ToString().GetString(),
+                now.Format(VAR_DATEVALUEONLY, LOCALE_USER_DEFAULT).GetString(),
+                now.Format(VAR_TIMEVALUEONLY, LOCALE_USER_DEFAULT).GetString());
+    std::printf(
+        "as '%%A, %%#d %%B %%Y': %s; as '%%Y-%%m-%%d %%H:%%M:%%S': %s; day %s of the year\n",
+        now.Format("%A, %#d %B %Y").GetString(), now.Format("%Y-%m-%d %H:%M:%S").GetString(),
+        now.Format("%#j").GetString());
+
+    CDateTime parsed;
+    parsed.FromString("March 31, 2024 6:30 PM");
+    CDateTime earlier = parsed;
+    earlier.AddMonths(-1);
+    std::printf("'March 31, 2024 6:30 PM' parses to %s; a month earlier is %s\n",
+                parsed.ToString().GetString(), earlier.ToString().GetString());
+    CJulianDate leapDay(2024, 2, 29);
+    CJulianDate nextYear = leapDay;
+    nextYear.AddYears(1);
+    std::printf("a year after %s comes %s, %s days later\n", leapDay.ToString().GetString(),
+                nextYear.ToString().GetString(),
+                AsString((nextYear - leapDay).GetTotalDays(), 0).GetString());
+    CTime evening(18, 0, 0);
+    evening.AddMinutes(7 * 60);
+    std::printf("6:00 PM plus 7 hours wraps to %s\n", evening.ToString().GetString());
+}
+
+int main(int argc, char* argv[]) {
     std::printf("vaskel tour\n");
     TourStrings();
     TourArchive();
@@ -280,6 +313,7 @@ int main() {
     TourLifetime();
     TourValuesAndText();
     TourConversionsAndSpans();
+    TourDatesAndTimes(argc > 1 ? argv[1] : nullptr);
     TourTimers();
     return 0;
 }

@@ -120,13 +120,17 @@ TEST(SystemTimeToVariantTime, IgnoresMillisecondsAndTheWeekday) {
     EXPECT_EQ(ToVariant(st), 2.5);
 }
 
-// Two-digit years up to 49 are 2000-2049, the rest 1950-1999.
+// Two-digit years up to 29 are 2000-2029, the rest 1930-1999: the system's
+// documented default window.
 TEST(SystemTimeToVariantTime, TwoDigitYearsUseTheWindow) {
     EXPECT_EQ(ToVariant(Record(90, 12, 31)), 33238.0);
     EXPECT_EQ(ToVariant(Record(50, 1, 1)), ToVariant(Record(1950, 1, 1)));
-    EXPECT_EQ(ToVariant(Record(49, 1, 1)), ToVariant(Record(2049, 1, 1)));
     EXPECT_EQ(ToVariant(Record(29, 1, 1)), 47119.0);
     EXPECT_EQ(ToVariant(Record(0, 1, 1)), 36526.0);
+    if (vaskel_test::RunningOnWine())
+        GTEST_SKIP() << "Wine 8 reads 30-49 as 2030-2049";
+    EXPECT_EQ(ToVariant(Record(30, 1, 1)), 10959.0);
+    EXPECT_EQ(ToVariant(Record(49, 1, 1)), ToVariant(Record(1949, 1, 1)));
 }
 
 TEST(SystemTimeToVariantTime, ZeroDayAndMonthStepBackAndLongDaysRollForward) {

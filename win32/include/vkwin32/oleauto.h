@@ -46,15 +46,14 @@ INT WINAPI VariantTimeToSystemTime(DOUBLE variantTime, LPSYSTEMTIME systemTime);
 // E_INVALIDARG.
 //
 // VarDateFromStr reads either locale's text in both layouts, ISO dates and
-// date-times ("2024-02-29", "2024-02-29T13:45:10", fractions of a second
-// rounded), English month names and three-letter abbreviations ("February
-// 29, 2024", "29 Feb 2024", "29-Feb-2024"), after an optional weekday, and
-// times alone ("13:45", "1 PM"), in any case and between blanks. Two-digit
-// years are 1930-2029. Numeric dates are month first or, with a year of
-// three digits or more first, year first: 13/1/2024 is refused, not read as
-// 13 January, and so is an AM/PM time with an hour past 12. Malformed text,
-// a null text or a day, month or time out of range gives
-// DISP_E_TYPEMISMATCH; a year written with three digits or more outside
+// date-times ("2024-02-29", "2024-02-29T13:45:10", no fractions of a
+// second, as the system refuses them), English month names and three-letter abbreviations
+// ("February 29, 2024", "29 Feb 2024", "29-Feb-2024"), after an optional weekday, and times alone
+// ("13:45", "1 PM"), in any case and between blanks. Two-digit years are 1930-2029, the system's
+// default window. Numeric dates are month first or, with a year of three digits or more first, year
+// first; a first number past 12 is the day (13/1/2024 is 13 January), and AM/PM after an hour past
+// 12 changes nothing, as the system reads them. Malformed text, a null text or a day, month or time
+// out of range gives DISP_E_TYPEMISMATCH; a year written with three digits or more outside
 // 100-9999, DISP_E_OVERFLOW. *result is written only on success.
 HRESULT WINAPI VarBstrFromDate(DATE dateIn, LCID lcid, ULONG flags, BSTR* result);
 HRESULT WINAPI VarDateFromStr(LPCOLESTR text, LCID lcid, ULONG flags, DATE* result);

@@ -12,10 +12,10 @@ INT WINAPI SystemTimeToVariantTime(LPSYSTEMTIME systemTime, DOUBLE* variantTime)
     const SYSTEMTIME& st = *systemTime;
     if (st.wMonth > 12 || st.wDay > 31 || static_cast<SHORT>(st.wYear) < 0)
         return FALSE;
-    // Two-digit years: 0-49 are this century's, 50-99 the last one's, the
-    // window current systems default to.
+    // Two-digit years: 0-29 are this century's, 30-99 the last one's, the
+    // system's documented default window.
     int year = st.wYear;
-    if (year < 50)
+    if (year < 30)
         year += 2000;
     else if (year < 100)
         year += 1900;

@@ -1,6 +1,7 @@
-// Case mapping of multibyte characters. In the UTF-8 code page only the
-// single-byte (ASCII) characters have a case mapping at this level; any other
-// value is returned unchanged, as for characters without case.
+// Case mapping and classification of multibyte characters. In the UTF-8 code
+// page only the single-byte (ASCII) characters have a case mapping or a class
+// at this level; any other value is returned unchanged, as for characters
+// without case, and is not white space.
 #include <vkwin32/crt.h>
 
 extern "C" unsigned int _mbctolower(unsigned int c) {
@@ -9,4 +10,8 @@ extern "C" unsigned int _mbctolower(unsigned int c) {
 
 extern "C" unsigned int _mbctoupper(unsigned int c) {
     return c >= 'a' && c <= 'z' ? c - ('a' - 'A') : c;
+}
+
+extern "C" int _ismbcspace(unsigned int c) {
+    return c == ' ' || (c >= '\t' && c <= '\r');
 }

@@ -269,6 +269,37 @@ void TourConversionsAndSpans() {
     std::printf("'mon, fri' as days of the week: %s\n", days.ToString().GetString());
 }
 
+void TourTokenLists() {
+    Section("Token lists and byte dumps");
+    CDelimitedString colours(" red, green ,, blue ");
+    std::printf("'%s' holds %u tokens; green is token %u\n", colours.GetString(),
+                static_cast<unsigned>(colours.GetTokenCount()),
+                static_cast<unsigned>(colours.FindToken("green")));
+    colours.InsertTokenAt(1, "orange");
+    colours.RemoveToken("blue");
+    std::printf("orange inserted as token 1, blue removed: '%s'\n", colours.GetString());
+    const CDelimitedString::SortingTraits ascending = {true, false, false};
+    colours.SortTokens(ascending);
+    colours.AddToken("Purple", ascending);
+    std::printf("sorted, then Purple added in order: '%s'\n", colours.GetString());
+
+    CSimpleTokenizer tokenizer("name=tour; size=3");
+    std::printf("the tokenizer reads:");
+    for (bool more = tokenizer.MoveFirstToken('='); more;) {
+        std::printf(" [%s]", tokenizer.GetCurToken().GetString());
+        more = tokenizer.MoveNextToken(tokenizer.GetCurPositionIndex() < 6 ? ";" : "=");
+    }
+    std::printf("\n");
+
+    const unsigned char bytes[] = {0xDE, 0xAD, 0xBE, 0xEF, 0x00, 0x01, 0x7F, 0x80, 0xFF};
+    std::printf("9 bytes in groups of 4, 2 groups a line:\n%s\n",
+                VKBytesToString(bytes, sizeof bytes, 4, 2).GetString());
+    CString drive, directory, name, extension;
+    VKSplitPath("C:\\tour\\data\\bytes.tar.gz", &drive, &directory, &name, &extension);
+    std::printf("C:\\tour\\data\\bytes.tar.gz splits into '%s' '%s' '%s' '%s'\n", drive.GetString(),
+                directory.GetString(), name.GetString(), extension.GetString());
+}
+
 // Today, or the date-time given on the command line (the pinned output
 // uses one so that it stays the same every day).
 void TourDatesAndTimes(const char* today) {
@@ -313,6 +344,7 @@ int main(int argc, char* argv[]) {
     TourLifetime();
     TourValuesAndText();
     TourConversionsAndSpans();
+    TourTokenLists();
     TourDatesAndTimes(argc > 1 ? argv[1] : nullptr);
     TourTimers();
     return 0;

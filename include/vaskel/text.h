@@ -1,12 +1,19 @@
-// Text: value conversions, bounded substring search and string-buffer
-// helpers.
+// Text: value conversions, bounded substring search, string-buffer helpers,
+// delimited token lists, a tokenizer, string vectors, path names and byte
+// dumps.
 #pragma once
 
 #include <vaskel/export.h>
+#include <vaskel/framework/array.h>
+#include <vaskel/framework/position.h>
 #include <vaskel/framework/string.h>
 #include <vaskel/win32.h>
 
+#include <vector>
+
 namespace vaskel {
+
+class CArchive;
 
 // The first occurrence of the pattern within the first textLength bytes of
 // the text, or null. Bytes are compared as they are, NUL included.
@@ -80,5 +87,256 @@ VASKEL_API double AsDouble(float value);
 // Rounding with halves away from zero; NaN gives 0.
 VASKEL_API double VKRoundFloat(double value);
 VASKEL_API double VKRoundFloat(double value, LONG places);
+
+// --- Delimited token lists
+
+// A string that holds tokens separated by one delimiter character, such as
+// "red, green ,blue". Reading is forgiving: white space around a token is
+// ignored and empty or blank segments are skipped. There is no quoting, so a
+// token never holds the delimiter. White space never counts as such where it
+// is the delimiter itself.
+//
+// A length that comes with a text may be all ones, meaning up to its NUL; any
+// length is cut at a NUL inside it. Offsets and indices that are not found
+// are all ones. A list's reading ends at the first NUL of its text.
+//
+// Appending writes raw text. Inserting, replacing, sorted adding and sorting
+// rebuild the list normalised: trimmed tokens joined by the bare delimiter.
+class VASKEL_API CDelimitedString : public CString {
+public:
+    struct FindTraits {
+        bool caseSensitive;
+        // Without case, Includes need not lower a side already in lower case.
+        bool selfLowerCase;
+        bool otherLowerCase;
+    };
+    struct SortingTraits {
+        bool ascending;
+        bool caseSensitive;
+        // Whether a token equal to one already listed is added again.
+        bool allowDuplicates;
+    };
+
+    explicit CDelimitedString(char delimiter = ',');
+    // The text as it is, not normalised.
+    CDelimitedString(const CString& text, char delimiter = ',');
+    CDelimitedString(const CDelimitedString& other) = default;
+    CDelimitedString(CDelimitedString&& other) noexcept = default;
+    virtual ~CDelimitedString();
+
+    CDelimitedString& operator=(const CDelimitedString& other) = default;
+    CDelimitedString& operator=(CDelimitedString&& other) noexcept = default;
+    // A plain string has no delimiter of its own: the delimiter becomes ",".
+    CDelimitedString& operator=(const CString& text);
+    CDelimitedString& operator+=(const CString& token);
+
+    char GetDelimiter() const { return m_delimiter; }
+    void SetDelimiter(char delimiter) { m_delimiter = delimiter; }
+
+    // The next token from the cursor in a NUL-terminated text: its start and
+    // length. The cursor moves behind the token's delimiter, or onto the NUL.
+    static bool GetNextToken(const char*& cursor, const char*& token, DWORD& length,
+                             char delimiter);
+    // Null for an empty text. A position is an offset into the text; it
+    // becomes null when no token is left.
+    POSITION GetFirstTokenPosition() const;
+    bool GetNextToken(POSITION& position, const char*& token, DWORD& length) const;
+    const char* GetNextToken(POSITION& position, DWORD& length) const;
+    CString GetNextToken(POSITION& position) const;
+    // Leaves the string as it was when no token is left.
+    CString& GetNextToken(POSITION& position, CString& token) const;
+    DWORD GetTokenCount() const;
+    bool GetTokenAt(DWORD index, const char*& token, DWORD& length) const;
+    CString GetTokenAt(DWORD index) const;
+    // Whether a walk over the tokens ends exactly at the end of the text:
+    // "a,b" and "a,b," are valid, "a, " and "a,," are not.
+    bool IsValid() const;
+
+    // The offset of the first whole-token occurrence of the token, trimmed,
+    // in the text. The search text may span several tokens ("a,b").
+    static DWORD FindTokenPosition(const char* text, DWORD textLength, const char* token,
+                                   DWORD tokenLength, char delimiter, bool caseSensitive);
+    DWORD FindTokenPosition(const FindTraits& traits, const char* token, DWORD length) const;
+    // The index of the first token equal to the text, which is not trimmed.
+    DWORD FindToken(const char* token, DWORD length) const;
+    DWORD FindToken(const CString& token) const;
+    DWORD FindTokenNoCase(const char* token, DWORD length) const;
+    DWORD FindTokenNoCase(const CString& token) const;
+    DWORD FindToken(const FindTraits& traits, const char* token, DWORD length) const;
+    DWORD FindToken(const FindTraits& traits, const CString& token) const;
+    static bool HasToken(const char* text, DWORD textLength, const char* token, DWORD tokenLength,
+                         char delimiter, bool caseSensitive);
+    bool HasToken(const char* token, DWORD length) const;
+    bool HasToken(const CString& token) const;
+    bool HasToken(const FindTraits& traits, const char* token, DWORD length) const;
+    bool HasToken(const FindTraits& traits, const CString& token) const;
+    // Whether every token of the second text is a token of the first.
+    static bool Includes(const char* text, DWORD textLength, const char* other, DWORD otherLength,
+                         char delimiter);
+    bool Includes(const CString& other) const;
+    bool Includes(const CString& other, const FindTraits& traits) const;
+    bool HasDuplicateTokens(const FindTraits& traits) const;
+
+    // Appends the delimiter (unless the text is empty) and the characters as
+    // they are; an empty token adds nothing.
+    void AddToken(const char* token, DWORD length);
+    void AddToken(const CString& token);
+    void AddToken(char token);
+    // Whether no white space surrounds a delimiter or the text, and the text
+    // neither starts nor ends with the delimiter.
+    bool Trimmed() const;
+    // Drops white space around the text and around every delimiter; the
+    // delimiters themselves stay.
+    void Trim();
+    // Narrows the range to exclude leading and trailing white space.
+    static void TrimToken(const char*& text, DWORD& length);
+    void AddStrings(const CStringArray& strings);
+    void AddStrings(const std::vector<CString>& strings);
+    // Appends every token; the existing elements stay.
+    void GetStrings(CStringArray& strings) const;
+    void GetStrings(std::vector<CString>& strings) const;
+
+    // Inserts the token, trimmed, in sorted position: false when it is empty,
+    // or equal to a listed token and duplicates are not allowed.
+    bool AddToken(const char* token, DWORD length, const SortingTraits& traits);
+    bool AddToken(const CString& token, const SortingTraits& traits);
+    // Inserts the token, trimmed, before the token with that index; the token
+    // count appends. False, leaving the list as it was, when the index is past
+    // the count or the list is not valid.
+    bool InsertTokenAt(DWORD index, const char* token, DWORD length);
+    bool InsertTokenAt(DWORD index, const CString& token);
+    // All or nothing, under the same conditions as InsertTokenAt.
+    bool ReplaceTokenAt(DWORD index, const char* token, DWORD length);
+    bool ReplaceTokenAt(DWORD index, CString token);
+    // Removes the token at that offset, its surrounding white space and one
+    // delimiter; an all-ones length runs to the next delimiter. False when
+    // the range does not cover whole tokens.
+    bool RemoveTokenAtPosition(DWORD offset, DWORD length);
+    bool RemoveTokenAt(DWORD index);
+    // Removes the first whole-token occurrence of the token, trimmed.
+    bool RemoveToken(const FindTraits& traits, const char* token, DWORD length);
+    bool RemoveToken(const FindTraits& traits, const CString& token);
+    bool RemoveToken(const char* token, DWORD length);
+    bool RemoveToken(const CString& token);
+    // Keeps the first of equal tokens; whether the text became shorter.
+    bool RemoveDuplicateTokens(const FindTraits& traits);
+    void SortTokens(const SortingTraits& traits);
+    // Appends the other list's tokens that this one lacks; an empty list takes
+    // the other text as it is. Whether anything was added.
+    bool Merge(const CString& other);
+    bool Merge(const CString& other, const SortingTraits& traits);
+
+private:
+    // White space that does not delimit tokens.
+    static bool IsBlank(char c, char delimiter);
+    // The first delimiter from a character boundary on, or the NUL.
+    static const char* NextDelimiter(const char* from, char delimiter);
+    // The length of the text up to its first NUL.
+    DWORD ListLength() const;
+    // Sets the text, keeping the delimiter.
+    void SetText(CString&& text);
+    bool Rebuild(DWORD index, const char* token, DWORD length, bool replace);
+
+    char m_delimiter;
+};
+
+// --- Tokenizer and string vectors
+
+// Walks a text token by token; each step names its own delimiter. Leading
+// white space of a token is skipped, trailing white space kept. A delimiter
+// right at the position gives an empty token (false) and is stepped over.
+class VASKEL_API CSimpleTokenizer {
+public:
+    explicit CSimpleTokenizer(const CString& text);
+
+    void SetString(const CString& text);
+    void SetCaseSensitive(bool caseSensitive) { m_caseSensitive = caseSensitive; }
+    bool GetCaseSensitive() const { return m_caseSensitive; }
+
+    // False for an empty text, which changes nothing.
+    bool MoveFirstToken(const char* delimiter);
+    bool MoveFirstToken(char delimiter);
+    // A null or empty delimiter is never found: the token runs to the end.
+    bool MoveNextToken(const char* delimiter);
+    bool MoveNextToken(char delimiter);
+    bool GetFirstToken(const char* delimiter, const char*& token, DWORD& length);
+    bool GetFirstToken(char delimiter, const char*& token, DWORD& length);
+    bool GetNextToken(const char* delimiter, const char*& token, DWORD& length);
+    bool GetNextToken(char delimiter, const char*& token, DWORD& length);
+
+    bool GetCurToken(const char*& token, DWORD& length) const;
+    // Null before the first step.
+    const char* GetCurToken(DWORD& length) const;
+    CString GetCurToken();
+
+    const char* GetFirstPosition() const { return m_text; }
+    // Null, and all ones as an index, before the first step.
+    const char* GetCurPosition() const;
+    DWORD GetCurPositionIndex() const { return m_position; }
+    bool eof() const;
+
+private:
+    static constexpr DWORD noPosition = 0xFFFFFFFF;
+
+    // Offsets rather than pointers, so that copies walk their own text.
+    CString m_text;
+    DWORD m_position;
+    DWORD m_tokenStart;
+    DWORD m_tokenLength;
+    bool m_caseSensitive;
+};
+
+// A vector of strings with a comma-joined text and an archived form.
+class VASKEL_API CStringVector : public std::vector<CString> {
+public:
+    CStringVector() = default;
+    CStringVector(const std::vector<CString>& other) : std::vector<CString>(other) {}
+    CStringVector(DWORD count, const CString& value) : std::vector<CString>(count, value) {}
+    CStringVector(const_iterator first, const_iterator last) : std::vector<CString>(first, last) {}
+
+    // The elements as they are, joined with ","; empty elements are left out.
+    CString ToString() const;
+    // Version 1, the count, then each string. Loading appends; an unknown
+    // version raises the bad-schema archive exception, and a short archive
+    // leaves the vector as it was.
+    void Serialize(CArchive& archive);
+};
+
+// --- Path names and byte dumps
+
+// The drive ("C:" or empty), the directory with its trailing separator, the
+// file name and the extension with its leading '.', by the runtime's
+// _splitpath_s; a null output skips its part. A null path has empty parts, and
+// a part longer than the runtime's part buffers (_MAX_DRIVE, _MAX_DIR,
+// _MAX_FNAME, _MAX_EXT less the NUL) empties every part asked for.
+VASKEL_API void VKSplitPath(const char* path, CString* drive, CString* directory, CString* fileName,
+                            CString* extension);
+VASKEL_API CString VKGetDrive(const char* path);
+VASKEL_API CString VKGetDirectory(const char* path);
+VASKEL_API CString VKGetFileName(const char* path);
+VASKEL_API CString VKGetFileExt(const char* path);
+// The drive letter and ':', the directory with a '\' added when it ends in no
+// separator, the file name, and the extension with a '.' added when it has
+// none, by the runtime's _makepath_s; null or empty parts add nothing. A path
+// longer than _MAX_PATH - 1 characters gives empty text.
+VASKEL_API CString VKMakePath(const char* drive, const char* directory, const char* fileName,
+                              const char* extension);
+
+// The byte's upper-case hexadecimal digits, high nibble first.
+VASKEL_API void VKByteToString(unsigned char value, char& high, char& low);
+// The length of a dump of count bytes: two digits a byte, a space between
+// groups of groupSize bytes (0: no groups) and CR LF in place of the space
+// after groupsPerLine groups (or bytes when groupSize is 0; 0: one line).
+// A length past 0xFFFFFFFF raises unexpected_error.
+VASKEL_API DWORD VKCalcBytesToStringBufferSize(DWORD count, DWORD groupSize, DWORD groupsPerLine);
+// Writes the dump, without a NUL, into a buffer of bufferSize characters.
+// Nothing is written for no bytes (count 0 or null bytes); a buffer too small
+// or null raises unexpected_error before anything is written.
+VASKEL_API void VKBytesToString(const unsigned char* bytes, DWORD count, char* buffer,
+                                DWORD bufferSize, DWORD groupSize, DWORD groupsPerLine);
+// The dump as a string, empty for no bytes; a dump longer than a string can
+// hold raises the memory exception.
+VASKEL_API CString VKBytesToString(const unsigned char* bytes, DWORD count, DWORD groupSize,
+                                   DWORD groupsPerLine);
 
 } // namespace vaskel

@@ -18,8 +18,8 @@ double VKRoundFloat(double value) {
 
 double VKRoundFloat(double value, LONG places) {
     // Binary exponentiation: exact for every power of ten a double holds.
-    unsigned long exponent = places < 0 ? 0ul - static_cast<unsigned long>(places)
-                                        : static_cast<unsigned long>(places);
+    unsigned long exponent =
+        places < 0 ? 0ul - static_cast<unsigned long>(places) : static_cast<unsigned long>(places);
     double factor = 1.0, base = 10.0;
     for (; exponent != 0; exponent >>= 1) {
         if (exponent & 1)
@@ -43,6 +43,8 @@ double AsCleanDouble(float value) {
     return places > 0 ? VKRoundFloat(widened, places) : VKRoundFloat(widened);
 }
 
-double AsDouble(float value) { return AsCleanDouble(value); }
+double AsDouble(float value) {
+    return AsCleanDouble(value);
+}
 
 } // namespace vaskel

@@ -19,10 +19,19 @@ void* operator new(std::size_t size) {
         return block;
     throw std::bad_alloc();
 }
+// The nothrow forms share the counted heap, so that a block from one form
+// is never freed by the other.
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
+    ++allocations;
+    return std::malloc(size ? size : 1);
+}
 void operator delete(void* block) noexcept {
     std::free(block);
 }
 void operator delete(void* block, std::size_t) noexcept {
+    std::free(block);
+}
+void operator delete(void* block, const std::nothrow_t&) noexcept {
     std::free(block);
 }
 

@@ -64,8 +64,10 @@ extern "C" {
 DWORD WINAPI GetCurrentThreadId(void);
 DWORD WINAPI GetCurrentProcessId(void);
 
-// Only the program itself (a null name) is a module here.
+// The program itself (a null name) and the system libraries whose
+// functions are looked up by name ("advapi32.dll") are modules here.
 HMODULE WINAPI GetModuleHandleA(LPCSTR moduleName);
+FARPROC WINAPI GetProcAddress(HMODULE module, LPCSTR procName);
 
 DWORD WINAPI GetLastError(void);
 void WINAPI SetLastError(DWORD errorCode);

@@ -72,6 +72,7 @@ typedef LONG_PTR LRESULT;
 typedef UINT_PTR WPARAM;
 typedef LONG_PTR LPARAM;
 typedef WORD ATOM;
+typedef INT_PTR(WINAPI* FARPROC)();
 
 typedef void* HANDLE;
 typedef HANDLE* PHANDLE;

@@ -12,3 +12,4 @@
 #include "user.h"
 #include "winerror.h"
 #include "winnls.h"
+#include "winreg.h"

@@ -16,9 +16,16 @@ struct Export {
     FARPROC address;
 };
 
+// Through void (*)(), the one pointer type every function pointer converts
+// to without a warning.
+template <class Function>
+FARPROC AsFarProc(Function* function) {
+    return reinterpret_cast<FARPROC>(reinterpret_cast<void (*)()>(function));
+}
+
 // The functions callers look up by name because older systems lack them.
 const Export advapiExports[] = {
-    {"RegDeleteKeyExA", reinterpret_cast<FARPROC>(&RegDeleteKeyExA)},
+    {"RegDeleteKeyExA", AsFarProc(&RegDeleteKeyExA)},
 };
 
 bool IsModuleName(LPCSTR name, const char* baseName) {

@@ -32,6 +32,28 @@ int CompareTokens(const char* a, DWORD aLength, const char* b, DWORD bLength, bo
     return aLength < bLength ? -1 : (aLength > bLength ? 1 : 0);
 }
 
+// An empty list takes the other text as it is; otherwise each of its tokens
+// that find does not locate is added. Whether anything was added.
+template <class Find, class Add>
+bool MergeTokens(CDelimitedString& list, const CString& other, Find find, Add add) {
+    if (list.IsEmpty()) {
+        // The other text is read with this list's delimiter, so it keeps it.
+        static_cast<CString&>(list) = other;
+        return !other.IsEmpty();
+    }
+    // A copy keeps the other text stable should it be this very list.
+    const CString source(other);
+    const char* cursor = source.GetString();
+    const char* token = nullptr;
+    DWORD length = 0;
+    bool added = false;
+    while (CDelimitedString::GetNextToken(cursor, token, length, list.GetDelimiter())) {
+        if (find(token, length) == notFound && add(token, length))
+            added = true;
+    }
+    return added;
+}
+
 } // namespace
 
 bool CDelimitedString::RemoveTokenAtPosition(DWORD offset, DWORD length) {
@@ -195,43 +217,23 @@ void CDelimitedString::SortTokens(const SortingTraits& traits) {
 }
 
 bool CDelimitedString::Merge(const CString& other) {
-    if (IsEmpty()) {
-        // The other text is read with this list's delimiter, so it keeps it.
-        CString::operator=(other);
-        return !other.IsEmpty();
-    }
-    // A copy keeps the other text stable should it be this very list.
-    const CString source(other);
-    const char* cursor = source.GetString();
-    const char* token = nullptr;
-    DWORD length = 0;
-    bool added = false;
-    while (GetNextToken(cursor, token, length, m_delimiter)) {
-        if (FindToken(token, length) == notFound) {
+    return MergeTokens(
+        *this, other, [this](const char* token, DWORD length) { return FindToken(token, length); },
+        [this](const char* token, DWORD length) {
             AddToken(token, length);
-            added = true;
-        }
-    }
-    return added;
+            return true;
+        });
 }
 
 bool CDelimitedString::Merge(const CString& other, const SortingTraits& traits) {
-    if (IsEmpty()) {
-        CString::operator=(other);
-        return !other.IsEmpty();
-    }
-    const CString source(other);
-    const char* cursor = source.GetString();
-    const char* token = nullptr;
-    DWORD length = 0;
-    bool added = false;
-    while (GetNextToken(cursor, token, length, m_delimiter)) {
-        DWORD found =
-            traits.caseSensitive ? FindToken(token, length) : FindTokenNoCase(token, length);
-        if (found == notFound && AddToken(token, length, traits))
-            added = true;
-    }
-    return added;
+    return MergeTokens(
+        *this, other,
+        [this, &traits](const char* token, DWORD length) {
+            return traits.caseSensitive ? FindToken(token, length) : FindTokenNoCase(token, length);
+        },
+        [this, &traits](const char* token, DWORD length) {
+            return AddToken(token, length, traits);
+        });
 }
 
 bool CDelimitedString::RemoveDuplicateTokens(const FindTraits& traits) {

@@ -1,3 +1,5 @@
+#include "text/delimited_string_support.h"
+
 #include <vaskel/text.h>
 
 #include <gtest/gtest.h>
@@ -13,22 +15,8 @@ using vaskel::CString;
 
 namespace {
 
-const DWORD allOnes = static_cast<DWORD>(-1);
-const CDelimitedString::FindTraits withCase{true, false, false};
-const CDelimitedString::FindTraits noCase{false, false, false};
+using namespace delimited_test;
 const CDelimitedString::SortingTraits ascendingUnique{true, true, false};
-
-using Strings = std::vector<std::string>;
-
-Strings Tokens(const CDelimitedString& list) {
-    std::vector<CString> strings;
-    list.GetStrings(strings);
-    return Strings(strings.begin(), strings.end());
-}
-
-CDelimitedString List(const char* text, char delimiter = ',') {
-    return CDelimitedString(CString(text), delimiter);
-}
 
 // An edit's result and the text it leaves, so a case reads as one line.
 struct Outcome {

@@ -1,3 +1,5 @@
+#include "text/delimited_string_support.h"
+
 #include <vaskel/text.h>
 
 #include <gtest/gtest.h>
@@ -14,21 +16,7 @@ using vaskel::POSITION;
 
 namespace {
 
-const DWORD allOnes = static_cast<DWORD>(-1);
-const CDelimitedString::FindTraits withCase{true, false, false};
-const CDelimitedString::FindTraits noCase{false, false, false};
-
-using Strings = std::vector<std::string>;
-
-Strings Tokens(const CDelimitedString& list) {
-    std::vector<CString> strings;
-    list.GetStrings(strings);
-    return Strings(strings.begin(), strings.end());
-}
-
-CDelimitedString List(const char* text, char delimiter = ',') {
-    return CDelimitedString(CString(text), delimiter);
-}
+using namespace delimited_test;
 
 } // namespace
 

@@ -1,9 +1,20 @@
 // The registry: keys under predefined roots, typed values, enumeration and
-// deletion, with the system's error codes. On this platform the store is a
-// database per hive in the directory VASKEL_REGISTRY names (else
-// $XDG_DATA_HOME/vaskel/registry or ~/.local/share/vaskel/registry);
-// HKEY_CLASSES_ROOT is HKEY_LOCAL_MACHINE\Software\Classes. Names compare
-// without case and keep their case.
+// deletion, with the system's error codes; like the system, these functions
+// report through their result and leave the last error alone.
+//
+// On this platform the store is an SQLite database per hive in the directory
+// VASKEL_REGISTRY names (else $XDG_DATA_HOME/vaskel/registry, else
+// ~/.local/share/vaskel/registry), read once per process and created private
+// to the user: user.db holds HKEY_CURRENT_USER, machine.db
+// HKEY_LOCAL_MACHINE, and HKEY_CLASSES_ROOT is HKEY_LOCAL_MACHINE\Software\Classes.
+// Several processes may use one store at once; a write that returned survives
+// the writer's crash. Key and value names compare without case (ASCII letters
+// only) and keep the case they were created with; limits count UTF-16 units of
+// the UTF-8 names, as the system counts them (keys 255, values 16383).
+// Subkeys and values enumerate in name order. Key classes, security
+// descriptors and last-write times are not kept (classes read back empty,
+// times as zero); a volatile key is refused with ERROR_NOT_SUPPORTED, since
+// the store cannot forget it at the next start.
 #pragma once
 
 #include "types.h"
@@ -50,14 +61,21 @@ typedef HKEY* PHKEY;
 
 extern "C" {
 
+// A null or empty subKey gives back the key passed in, not a new handle.
 LSTATUS WINAPI RegOpenKeyA(HKEY key, LPCSTR subKey, PHKEY result);
-LSTATUS WINAPI RegOpenKeyExA(HKEY key, LPCSTR subKey, DWORD options, REGSAM desired,
-                             PHKEY result);
+// A null or empty subKey gives a new handle to the key, or the predefined key
+// itself. Paths refuse a leading backslash with ERROR_BAD_PATHNAME, in every
+// function, except here below HKEY_CLASSES_ROOT; repeated and trailing
+// backslashes are accepted.
+LSTATUS WINAPI RegOpenKeyExA(HKEY key, LPCSTR subKey, DWORD options, REGSAM desired, PHKEY result);
 LSTATUS WINAPI RegCreateKeyExA(HKEY key, LPCSTR subKey, DWORD reserved, LPSTR keyClass,
                                DWORD options, REGSAM desired,
                                LPSECURITY_ATTRIBUTES securityAttributes, PHKEY result,
                                LPDWORD disposition);
+// Closing a predefined key succeeds and leaves it usable.
 LSTATUS WINAPI RegCloseKey(HKEY key);
+// String data stored without a terminating NUL gets one in the caller's
+// buffer when there is room, without counting it in the size.
 LSTATUS WINAPI RegQueryValueExA(HKEY key, LPCSTR valueName, LPDWORD reserved, LPDWORD type,
                                 LPBYTE data, LPDWORD dataSize);
 LSTATUS WINAPI RegSetValueExA(HKEY key, LPCSTR valueName, DWORD reserved, DWORD type,
@@ -68,7 +86,7 @@ LSTATUS WINAPI RegEnumKeyExA(HKEY key, DWORD index, LPSTR name, LPDWORD nameLeng
 LSTATUS WINAPI RegEnumValueA(HKEY key, DWORD index, LPSTR valueName, LPDWORD valueNameLength,
                              LPDWORD reserved, LPDWORD type, LPBYTE data, LPDWORD dataSize);
 LSTATUS WINAPI RegDeleteValueA(HKEY key, LPCSTR valueName);
-// Fails with ERROR_ACCESS_DENIED while the key has subkeys.
+// Fails with ERROR_ACCESS_DENIED while the key has subkeys, and for the roots.
 LSTATUS WINAPI RegDeleteKeyA(HKEY key, LPCSTR subKey);
 LSTATUS WINAPI RegDeleteKeyExA(HKEY key, LPCSTR subKey, REGSAM desired, DWORD reserved);
 

@@ -7,6 +7,7 @@
 #include <vaskel/framework/mem_file.h>
 #include <vaskel/framework/string.h>
 #include <vaskel/queue.h>
+#include <vaskel/registry.h>
 #include <vaskel/sync.h>
 #include <vaskel/text.h>
 #include <vaskel/timer.h>
@@ -300,6 +301,32 @@ void TourTokenLists() {
                 directory.GetString(), name.GetString(), extension.GetString());
 }
 
+void TourRegistry() {
+    Section("Registry");
+    const char path[] = "Software\\vaskel-tour";
+    {
+        CRegistry key(path, true);
+        CStringArray colours;
+        colours.Add("red");
+        colours.Add("green");
+        const bool written = key.SetValue("Count", 3) && key.SetValue("Ratio", 0.25) &&
+                             key.SetValue("Name", "tour") && key.SetValue("Colours", colours);
+        std::printf("four typed values written under HKCU\\%s: %s\n", path, written ? "yes" : "no");
+        CStringArray back;
+        key.GetValue("Colours", back);
+        std::printf("read back: Count %d, Ratio %.2f, Name '%s', Colours %s and %s; "
+                    "a missing value gives its default %d\n",
+                    key.GetInteger("Count", 0), key.GetDouble("Ratio", 0.0),
+                    key.GetString("Name", "").GetString(),
+                    back.GetSize() > 0 ? back[0].GetString() : "?",
+                    back.GetSize() > 1 ? back[1].GetString() : "?", key.GetInteger("Missing", -1));
+    }
+    CRegistry software(HKEY_CURRENT_USER, "Software", false, false);
+    const bool deleted = software.DeleteKey("vaskel-tour", true);
+    std::printf("the key deleted with its values: %s; still there: %s\n", deleted ? "yes" : "no",
+                software.KeyExist("vaskel-tour") ? "yes" : "no");
+}
+
 // Today, or the date-time given on the command line (the pinned output
 // uses one so that it stays the same every day).
 void TourDatesAndTimes(const char* today) {
@@ -345,6 +372,7 @@ int main(int argc, char* argv[]) {
     TourValuesAndText();
     TourConversionsAndSpans();
     TourTokenLists();
+    TourRegistry();
     TourDatesAndTimes(argc > 1 ? argv[1] : nullptr);
     TourTimers();
     return 0;

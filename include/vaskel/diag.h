@@ -52,6 +52,13 @@ private:
     static DWORD GetConditionTableSize();
 };
 
+// Developer switches, read once per process from the user's registry key
+// Software\Orvalen\Zephrane\Common\DeveloperMode (values "DeveloperMode"
+// and "IgnoreAssert", non-zero for on); a later change takes effect at the
+// next start.
+VASKEL_API bool IsDeveloperMode();
+VASKEL_API bool VKIgnoreAssert();
+
 // The floating-point status word, in the runtime library's _SW_ flags.
 VASKEL_API DWORD GetStatus87();
 // Clears the floating-point exception flags; returns the status before.

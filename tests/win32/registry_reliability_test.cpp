@@ -275,7 +275,7 @@ TEST(RegistryStoreTest, StoreLocations) {
          base.Path() / "data/vaskel/registry/user.db"},
         {{{"VASKEL_REGISTRY", ""}, {"XDG_DATA_HOME", ""}, {"HOME", home}},
          base.Path() / "home/.local/share/vaskel/registry/user.db"},
-        // The base directory specification ignores a relative data home.
+        // XDG rules ignore a relative data home.
         {{{"VASKEL_REGISTRY", ""}, {"XDG_DATA_HOME", "relative"}, {"HOME", home + "2"}},
          base.Path() / "home2/.local/share/vaskel/registry/user.db"},
     };

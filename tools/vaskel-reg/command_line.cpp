@@ -12,42 +12,42 @@ std::string Lower(std::string text) {
 }
 
 // The switch the argument names, or null.
-const SwitchSpec* FindSwitch(const std::string& arg, std::initializer_list<SwitchSpec> switches) {
+const SwitchRule* FindSwitch(const std::string& arg, std::initializer_list<SwitchRule> switches) {
     if (arg.size() < 2 || (arg[0] != '/' && arg[0] != '-'))
         return nullptr;
     const std::string name = Lower(arg.substr(1));
-    for (const SwitchSpec& spec : switches)
-        if (name == spec.name)
-            return &spec;
+    for (const SwitchRule& rule : switches)
+        if (name == rule.name)
+            return &rule;
     return nullptr;
 }
 
 } // namespace
 
 bool Arguments::Parse(const std::vector<std::string>& args,
-                      std::initializer_list<SwitchSpec> switches, std::string& error) {
+                      std::initializer_list<SwitchRule> switches, std::string& error) {
     m_positionals.clear();
     m_switches.clear();
     for (std::size_t i = 0; i < args.size(); ++i) {
-        const SwitchSpec* spec = FindSwitch(args[i], switches);
-        if (spec == nullptr) {
+        const SwitchRule* rule = FindSwitch(args[i], switches);
+        if (rule == nullptr) {
             m_positionals.push_back(args[i]);
             continue;
         }
-        const std::string name = std::string("/") + spec->name;
-        if (Has(spec->name)) {
+        const std::string name = std::string("/") + rule->name;
+        if (Has(rule->name)) {
             error = "the switch " + name + " is given twice";
             return false;
         }
         std::string value;
-        if (spec->takesValue) {
+        if (rule->takesValue) {
             if (i + 1 == args.size()) {
                 error = "the switch " + name + " needs a value after it";
                 return false;
             }
             value = args[++i];
         }
-        m_switches.emplace(spec->name, std::move(value));
+        m_switches.emplace(rule->name, std::move(value));
     }
     return true;
 }

@@ -11,7 +11,7 @@
 
 namespace vaskel::regtool {
 
-struct SwitchSpec {
+struct SwitchRule {
     const char* name; // lower case, without the / or -
     bool takesValue;
 };
@@ -19,7 +19,7 @@ struct SwitchSpec {
 class Arguments {
 public:
     // Fails with a message for a switch given twice or missing its value.
-    bool Parse(const std::vector<std::string>& args, std::initializer_list<SwitchSpec> switches,
+    bool Parse(const std::vector<std::string>& args, std::initializer_list<SwitchRule> switches,
                std::string& error);
 
     const std::vector<std::string>& Positionals() const { return m_positionals; }

@@ -30,7 +30,7 @@ std::string HomeDirectory() {
 std::string FindDirectory() {
     if (const char* chosen = std::getenv("VASKEL_REGISTRY"); chosen != nullptr && *chosen != '\0')
         return chosen;
-    // The base directory specification ignores a relative XDG_DATA_HOME.
+    // XDG rules ignore a relative XDG_DATA_HOME.
     if (const char* data = std::getenv("XDG_DATA_HOME"); data != nullptr && *data == '/')
         return std::string(data) + "/vaskel/registry";
     const std::string home = HomeDirectory();

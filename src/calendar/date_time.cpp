@@ -1,4 +1,5 @@
 #include "calendar/calendar_shift.h"
+#include "calendar/day_fractions.h"
 
 #include <vaskel/calendar.h>
 #include <vaskel/diag.h>
@@ -9,9 +10,6 @@
 
 namespace vaskel {
 namespace {
-
-const double dayPerMinute = 0.0006944444444444445;
-const double dayPerSecond = 1.1574074074074073e-05;
 
 double DatePart(double value) {
     return std::trunc(value);

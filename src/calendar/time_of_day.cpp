@@ -1,12 +1,11 @@
+#include "calendar/day_fractions.h"
+
 #include <vaskel/calendar.h>
 
 #include <cmath>
 
 namespace vaskel {
 namespace {
-
-const double dayPerMinute = 0.0006944444444444445;
-const double dayPerSecond = 1.1574074074074073e-05;
 
 // Keeps the sign of the value: -1.25 gives -0.25.
 double PlainFraction(double value) {

@@ -1,3 +1,5 @@
+#include "calendar/day_fractions.h"
+
 #include <vaskel/calendar.h>
 #include <vaskel/text.h>
 
@@ -10,12 +12,6 @@
 
 namespace vaskel {
 namespace {
-
-// The reciprocals of the units in a day, as the nearest doubles.
-const double dayPerHour = 0.041666666666666664;
-const double dayPerMinute = 0.0006944444444444445;
-const double dayPerSecond = 1.1574074074074073e-05;
-const double dayPerMillisecond = 1.1574074074074074e-08;
 
 // Whole values beyond the 32-bit range saturate instead of overflowing; the
 // 32-bit limit keeps the results the same on every platform.

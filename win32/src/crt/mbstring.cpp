@@ -6,6 +6,8 @@
 // big-endian number: 'A' is 0x41, U+00E9 (C3 A9) is 0xC3A9 and U+20AC
 // (E2 82 AC) is 0xE282AC, the UTF-8 form of the lead-byte-first values of
 // the double-byte code pages.
+#include "kernel/utf8.h"
+
 #include <vkwin32/crt.h>
 
 #include <cerrno>
@@ -18,22 +20,12 @@ bool IsLeadByte(unsigned char c) {
 }
 
 // The length of the well-formed character at text, or 1 where none begins.
+// Decoding stops at the first byte that cannot continue the character, so a
+// NUL ends it before the end of the text is passed.
 size_t CharLength(const unsigned char* text) {
-    unsigned char lead = text[0];
-    if (!IsLeadByte(lead))
-        return 1;
-    size_t length = lead < 0xE0 ? 2 : lead < 0xF0 ? 3 : 4;
-    // The second byte's range excludes overlong forms, surrogates and
-    // values past U+10FFFF.
-    unsigned char low = lead == 0xE0 ? 0xA0 : lead == 0xF0 ? 0x90 : 0x80;
-    unsigned char high = lead == 0xED ? 0x9F : lead == 0xF4 ? 0x8F : 0xBF;
-    for (size_t i = 1; i < length; ++i) {
-        if (text[i] < low || text[i] > high) // a NUL ends the sequence here too
-            return 1;
-        low = 0x80;
-        high = 0xBF;
-    }
-    return length;
+    int length = 0;
+    char32_t ignored;
+    return vkw32::DecodeUtf8(text, 4, length, ignored) ? static_cast<size_t>(length) : 1;
 }
 
 unsigned int CharValue(const unsigned char* text, size_t length) {

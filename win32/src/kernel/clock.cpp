@@ -25,16 +25,22 @@ struct timespec Now() {
     return now;
 }
 
-} // namespace
-
-ULONGLONG MillisecondClock() {
-    // The coarse clock is read without a system call and still ticks every
-    // few milliseconds, finer than the tick count Windows keeps.
+ULONGLONG Milliseconds(clockid_t clock) {
     struct timespec now;
-    ::clock_gettime(CLOCK_MONOTONIC_COARSE, &now);
+    ::clock_gettime(clock, &now);
     return static_cast<ULONGLONG>(now.tv_sec) * 1000 +
            static_cast<ULONGLONG>(now.tv_nsec) / 1000000 +
            tickOffset.load(std::memory_order_relaxed);
+}
+
+} // namespace
+
+ULONGLONG MillisecondClock() {
+    return Milliseconds(CLOCK_MONOTONIC_COARSE);
+}
+
+ULONGLONG PreciseMillisecondClock() {
+    return Milliseconds(CLOCK_MONOTONIC);
 }
 
 } // namespace vkw32

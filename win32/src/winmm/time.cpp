@@ -3,5 +3,5 @@
 #include <vkwin32/mmsystem.h>
 
 extern "C" DWORD WINAPI timeGetTime(void) {
-    return static_cast<DWORD>(vkw32::MillisecondClock());
+    return static_cast<DWORD>(vkw32::PreciseMillisecondClock());
 }

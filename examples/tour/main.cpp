@@ -171,6 +171,40 @@ void TourTimers() {
                 parse.m_dMinimum, parse.m_dMaximum, parse.m_dAverage);
 }
 
+// Prints each delivery at the due time it served: the controller delivers in
+// due order, however late the thread gets to it.
+struct TimerReport : ITimerEvents {
+    void OnTimeElapsed(DWORD eventId) override {
+        const DWORD due = eventId == 1 ? 300 * ++periodicCount : 500;
+        early = early || timeGetTime() - setAt < due;
+        std::printf("  +%u ms: the %s timer\n", static_cast<unsigned>(due),
+                    eventId == 1 ? "300 ms periodic" : "500 ms one-shot");
+    }
+    DWORD setAt = 0;
+    DWORD periodicCount = 0;
+    bool early = false;
+};
+
+void TourTimerController() {
+    Section("Timer controller");
+    CTimerController controller;
+    controller.Create();
+    TimerReport report;
+    report.setAt = timeGetTime();
+    controller.SetTimer(&report, 1, 300, false);
+    controller.SetTimer(&report, 2, 500, true);
+    std::printf("two timers on one controller, delivered on this thread:\n");
+    const DWORD safetyNet = 30000;
+    while (report.periodicCount < 3 && timeGetTime() - report.setAt < safetyNet) {
+        MsgWaitForMultipleObjects(0, nullptr, FALSE, 50, QS_ALLINPUT);
+        MSG msg;
+        while (PeekMessageA(&msg, nullptr, 0, 0, PM_REMOVE))
+            DispatchMessageA(&msg);
+    }
+    std::printf("none fired early: %s; timers left: %u\n", report.early ? "no" : "yes",
+                static_cast<unsigned>(controller.GetSize()));
+}
+
 // Answers on the thread that created it: a posted number is remembered, a
 // sent one is doubled.
 struct DoublingWnd : CVKMsgWnd {
@@ -375,5 +409,6 @@ int main(int argc, char* argv[]) {
     TourRegistry();
     TourDatesAndTimes(argc > 1 ? argv[1] : nullptr);
     TourTimers();
+    TourTimerController();
     return 0;
 }

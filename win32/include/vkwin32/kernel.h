@@ -1,5 +1,5 @@
-// Kernel services: threads' identity, the last-error value, handles, files
-// and code-page conversions.
+// Kernel services: threads' identity, the last-error value, handles, files,
+// global memory and code-page conversions.
 #pragma once
 
 #include "types.h"
@@ -36,6 +36,13 @@
 #define FILE_CURRENT 1
 #define FILE_END 2
 #define INVALID_SET_FILE_POINTER 0xFFFFFFFFu
+
+#define GMEM_FIXED 0x0000
+#define GMEM_MOVEABLE 0x0002
+#define GMEM_ZEROINIT 0x0040
+#define GMEM_MODIFY 0x0080
+#define GPTR (GMEM_FIXED | GMEM_ZEROINIT)
+#define GHND (GMEM_MOVEABLE | GMEM_ZEROINIT)
 
 #define CP_ACP 0
 #define CP_OEMCP 1
@@ -92,6 +99,17 @@ BOOL WINAPI GetFileAttributesExA(LPCSTR fileName, GET_FILEEX_INFO_LEVELS infoLev
 DWORD WINAPI GetFileAttributesA(LPCSTR fileName);
 BOOL WINAPI DeleteFileA(LPCSTR fileName);
 BOOL WINAPI MoveFileA(LPCSTR existingFileName, LPCSTR newFileName);
+
+// Global memory. A fixed block's handle is its address; a movable block's
+// handle stays the same for its whole life and GlobalLock gives its address.
+// A handle that names no live block fails with ERROR_INVALID_HANDLE.
+HGLOBAL WINAPI GlobalAlloc(UINT flags, SIZE_T bytes);
+HGLOBAL WINAPI GlobalReAlloc(HGLOBAL memory, SIZE_T bytes, UINT flags);
+HGLOBAL WINAPI GlobalFree(HGLOBAL memory);
+LPVOID WINAPI GlobalLock(HGLOBAL memory);
+BOOL WINAPI GlobalUnlock(HGLOBAL memory);
+SIZE_T WINAPI GlobalSize(HGLOBAL memory);
+HGLOBAL WINAPI GlobalHandle(LPCVOID memory);
 
 UINT WINAPI GetACP(void);
 int WINAPI MultiByteToWideChar(UINT codePage, DWORD flags, LPCSTR multiByteStr, int multiByteCount,

@@ -1,6 +1,7 @@
-// COM apartment initialisation for a thread.
+// COM apartment initialisation for a thread, and the storage medium.
 #pragma once
 
+#include "objidl.h"
 #include "types.h"
 #include "winerror.h"
 

@@ -1,10 +1,12 @@
-// OLE Automation: strings with a length prefix and variant dates. On this
-// platform the user's and the system's default locales are both en-US.
+// OLE Automation: type codes, strings with a length prefix and variant
+// dates. On this platform the user's and the system's default locales are
+// both en-US.
 #pragma once
 
 #include "types.h"
 #include "winerror.h"
 #include "winnls.h"
+#include "wtypes.h"
 
 typedef double DATE;
 

@@ -6,6 +6,7 @@
 #include <vaskel/framework/list.h>
 #include <vaskel/framework/mem_file.h>
 #include <vaskel/framework/string.h>
+#include <vaskel/namevalue.h>
 #include <vaskel/queue.h>
 #include <vaskel/registry.h>
 #include <vaskel/sync.h>
@@ -145,6 +146,38 @@ void TourValuesAndText() {
     char buffer[6];
     VKCopyStringToBuffer(buffer, sizeof buffer, CString("truncated"));
     std::printf("copied into 6 bytes: '%s'\n", buffer);
+}
+
+void TourNameValues() {
+    Section("Name-value lists and blobs");
+    CVKNameValueVector pairs;
+    pairs.push_back(CVKNameValue("name", CGenericVal("tour")));
+    pairs.push_back(CVKNameValue("count", CGenericVal(42)));
+    pairs.push_back(CVKNameValue("ratio", CGenericVal(0.25)));
+    pairs.push_back(CVKNameValue("enabled", CGenericVal(true)));
+    pairs.push_back(CVKNameValue("since", CGenericVal(CDateTime(2024, 2, 29, 13, 45, 10))));
+    CVKNameValueGrammar grammar;
+    grammar.SetSeparator("; ", true);
+    const CString text = grammar.Write(pairs);
+    std::printf("written: %s\n", text.GetString());
+    CVKNameValueVector read;
+    const bool ok = grammar.Read(text, read);
+    std::printf("read back: %s, %u pairs, every value now text\n", ok ? "yes" : "no",
+                static_cast<unsigned>(read.size()));
+    const CVKNameValue* count = read.GetNoCase("COUNT");
+    CGenericVal number;
+    if (count != nullptr && number.Parse(count->GetValue().ToString(), VT_I4))
+        std::printf("'COUNT' found without case, parsed as %s: %ld\n",
+                    number.GetType().ToString(), static_cast<long>(number.GetLong()));
+
+    const char bytes[] = "vaskel keeps bytes in blobs";
+    CBlob blob(bytes, sizeof bytes - 1);
+    CBlob shared = blob;
+    shared.GetBuffer()[0] = 'V';
+    std::printf("a blob of %u bytes in Base64: %s\n", static_cast<unsigned>(blob.GetSize()),
+                blob.ToString().GetString());
+    std::printf("its copy was changed on write; the original still starts with '%c'\n",
+                blob.GetData()[0]);
 }
 
 void TourTimers() {
@@ -408,6 +441,7 @@ int main(int argc, char* argv[]) {
     TourTokenLists();
     TourRegistry();
     TourDatesAndTimes(argc > 1 ? argv[1] : nullptr);
+    TourNameValues();
     TourTimers();
     TourTimerController();
     return 0;

@@ -109,6 +109,12 @@ private:
     };
 };
 
+// An enumeration wrapper as functions hand it out: a value that answers the
+// wrapper's own queries and the helper's comparisons. The wrappers derive
+// from CVKEnumHelper, so each already is that value.
+template <class X>
+using CVKEnumHelperWrapper = X;
+
 struct VASKEL_API CalendarMonthX : public CVKEnumHelper<ECalendarMonth> {
     using CVKEnumHelper::CVKEnumHelper;
     using CVKEnumHelper::operator=;

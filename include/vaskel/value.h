@@ -1,6 +1,8 @@
-// Values: the shared byte blob, colours and rectangles.
+// Values: the shared byte blob, the tagged generic value with its type tag,
+// colours and rectangles.
 #pragma once
 
+#include <vaskel/calendar.h>
 #include <vaskel/export.h>
 #include <vaskel/framework/string.h>
 #include <vaskel/win32.h>
@@ -98,6 +100,239 @@ private:
     void Adopt(Buffer* buffer);
 
     Buffer* m_pBuffer;
+};
+
+// An automation type tag with its name and its class (numeric, integral,
+// text...). A tag with a flag bit (array, by reference) is none of them.
+struct VASKEL_API VarTypeX : public CVKEnumHelper<VARENUM> {
+    using CVKEnumHelper::CVKEnumHelper;
+    using CVKEnumHelper::operator=;
+
+    bool IsEmpty() const { return Is(VT_EMPTY); }
+    bool IsNull() const { return Is(VT_NULL); }
+    bool IsBool() const { return Is(VT_BOOL); }
+    bool IsChar() const { return Is(VT_I1); }
+    bool IsByte() const { return Is(VT_UI1); }
+    bool IsShort() const { return Is(VT_I2); }
+    bool IsUShort() const { return Is(VT_UI2); }
+    bool IsLong() const { return Is(VT_I4); }
+    bool IsULong() const { return Is(VT_UI4); }
+    bool IsInt() const { return Is(VT_INT); }
+    bool IsUInt() const { return Is(VT_UINT); }
+    bool IsLong64() const { return Is(VT_I8); }
+    bool IsULong64() const { return Is(VT_UI8); }
+    bool IsFloat() const { return Is(VT_R4); }
+    bool IsDouble() const { return Is(VT_R8); }
+    bool IsDate() const { return Is(VT_DATE); }
+    bool IsString() const { return Is(VT_LPSTR); }
+    bool IsComString() const { return Is(VT_BSTR); }
+    bool IsError() const { return Is(VT_ERROR); }
+    bool IsBlob() const { return Is(VT_BLOB); }
+
+    void SetAsEmpty() { SetValue(VT_EMPTY); }
+    void SetAsNull() { SetValue(VT_NULL); }
+    void SetAsBool() { SetValue(VT_BOOL); }
+    void SetAsChar() { SetValue(VT_I1); }
+    void SetAsByte() { SetValue(VT_UI1); }
+    void SetAsShort() { SetValue(VT_I2); }
+    void SetAsUShort() { SetValue(VT_UI2); }
+    void SetAsLong() { SetValue(VT_I4); }
+    void SetAsULong() { SetValue(VT_UI4); }
+    void SetAsInt() { SetValue(VT_INT); }
+    void SetAsUInt() { SetValue(VT_UINT); }
+    void SetAsLong64() { SetValue(VT_I8); }
+    void SetAsULong64() { SetValue(VT_UI8); }
+    void SetAsFloat() { SetValue(VT_R4); }
+    void SetAsDouble() { SetValue(VT_R8); }
+    void SetAsDate() { SetValue(VT_DATE); }
+    void SetAsString() { SetValue(VT_LPSTR); }
+    void SetAsComString() { SetValue(VT_BSTR); }
+    void SetAsError() { SetValue(VT_ERROR); }
+    void SetAsBlob() { SetValue(VT_BLOB); }
+
+    // Bool counts as unsigned and Date as floating point; Empty, Null, Error
+    // and BLOB belong to no class.
+    bool IsNumeric() const;
+    bool IsIntegral() const;
+    bool IsSignedIntegral() const;
+    bool IsUnsignedIntegral() const;
+    bool IsFloatingPoint() const;
+    bool IsText() const;
+
+    // "Long", "String", "BLOB"...; "Unknown" for a tag without a name.
+    const char* ToString() const { return ToString(GetValue()); }
+    static const char* ToString(VARENUM type);
+    static const char* ToString(unsigned short type);
+
+    // The tag whose name is the whole text, ignoring case. Any other text
+    // ("Unknown" too) gives false and leaves the tag as it was.
+    static bool Parse(const char* text, VARENUM& type);
+    bool Parse(const char* text);
+};
+
+// One value of a small set of automation types, tagged with its VARENUM:
+// Empty, Null (only through ChangeType), Bool, Char, Byte, Short, UShort,
+// Long, ULong, Float, Double, Date, Error, String (a CString) and BLOB (a
+// shared CBlob). Numbers take no heap. The 8-byte payload is zero whenever
+// the value holds nothing, and a member narrower than the payload leaves the
+// rest of it zero.
+class VASKEL_API CGenericVal {
+public:
+    CGenericVal() : m_vt(VT_EMPTY) {}
+    CGenericVal(const CGenericVal& other);
+    CGenericVal(const CString& text);
+    // A null pointer gives empty text.
+    CGenericVal(const char* text);
+    CGenericVal(double value);
+    CGenericVal(float value);
+    CGenericVal(bool value);
+    // A long or unsigned long past 32 bits raises unexpected_error, as the
+    // setters do.
+    CGenericVal(unsigned long value);
+    CGenericVal(unsigned int value);
+    CGenericVal(int value);
+    CGenericVal(long value);
+    CGenericVal(unsigned short value);
+    CGenericVal(short value);
+    CGenericVal(unsigned char value);
+    CGenericVal(char value);
+    // Midnight of the day.
+    CGenericVal(const CJulianDate& date);
+    CGenericVal(const CDateTime& dateTime);
+    CGenericVal(const CBlob& blob);
+    ~CGenericVal();
+
+    // Each gives the value the setter's tag, emptying a value of another tag
+    // first; SetLong, SetULong and SetError raise unexpected_error, and
+    // change nothing, for a number past 32 bits.
+    void SetShort(short value);
+    void SetUShort(unsigned short value);
+    void SetLong(long value);
+    void SetULong(unsigned long value);
+    void SetByte(unsigned char value);
+    void SetChar(char value);
+    void SetBool(bool value);
+    void SetFloat(float value);
+    void SetDouble(double value);
+    void SetDate(double value);
+    void SetError(long value);
+    void SetString(const CString& text);
+    // Shares the blob's buffer.
+    void SetBlob(const CBlob& blob);
+
+    // The payload as that type whatever the tag: callers check the tag first.
+    short GetShort() const { return m_iVal; }
+    unsigned short GetUShort() const { return m_uiVal; }
+    LONG GetLong() const { return m_lVal; }
+    ULONG GetULong() const { return m_ulVal; }
+    LONG GetError() const { return m_scode; }
+    // Through the byte, so that another tag's payload never reads as an
+    // invalid bool.
+    bool GetBool() const { return m_bVal != 0; }
+    char GetChar() const { return m_cVal; }
+    unsigned char GetByte() const { return m_bVal; }
+    float GetFloat() const { return m_fltVal; }
+    double GetDouble() const { return m_dblVal; }
+    double GetDate() const { return m_dblVal; }
+
+    // The held text or blob, to read or to change in place; unexpected_error
+    // under any other tag.
+    const CString& GetString() const { return GetStringRef(); }
+    CString& GetString() { return GetStringRef(); }
+    const CBlob& GetBlob() const { return GetBlobRef(); }
+    CBlob& GetBlob() { return GetBlobRef(); }
+
+    // Only under the tag of out's type, without conversion: a Date is no
+    // double and a Double no CDateTime. False leaves out as it was.
+    bool GetValue(bool& out) const;
+    bool GetValue(char& out) const;
+    bool GetValue(unsigned char& out) const;
+    bool GetValue(short& out) const;
+    bool GetValue(unsigned short& out) const;
+    bool GetValue(int& out) const;
+    bool GetValue(long& out) const;
+    bool GetValue(unsigned int& out) const;
+    bool GetValue(unsigned long& out) const;
+    bool GetValue(float& out) const;
+    bool GetValue(double& out) const;
+    bool GetValue(CDateTime& out) const;
+    bool GetValue(CString& out) const;
+    // The value's own text, valid until the value next changes.
+    bool GetValue(const char*& out) const;
+    // Shares the blob's buffer.
+    bool GetValue(CBlob& out) const;
+    // A copy of the whole value; always true.
+    bool GetValue(CGenericVal& out) const;
+
+    // Text and blobs go through SetString and SetBlob, so they are shared;
+    // anything else is the tag and the whole payload.
+    void Copy(const CGenericVal& other);
+    const CGenericVal& operator=(const CGenericVal& other);
+    void Empty();
+    // A Null value is not empty.
+    bool IsEmpty() const { return m_vt == VT_EMPTY; }
+    CVKEnumHelperWrapper<VarTypeX> GetType() const { return VarTypeX(m_vt); }
+
+    // Numbers as they are (a ULong stays positive, a Bool is 0 or 1); 0.0
+    // for every other tag, text included.
+    double GetAsDouble() const;
+    // Numbers by AsString, a Bool as "True" or "False", a Date by
+    // CDateTime::Format in the user's default locale, text as it is, a blob
+    // as Base64; empty text for every other tag.
+    CString& GetAsString(CString& out) const;
+    CString GetAsString() const;
+    CString ToString() const { return GetAsString(); }
+
+    // Reads text as the type and stores it with the type's setter. Integers
+    // read as atol does: white space, a sign, digits up to anything else, no
+    // digits being 0, saturating at the 32-bit limits, except that a ULong
+    // reads up to 4294967295; Short, Byte and UShort keep the low bits, so
+    // "-1" is 255 as a Byte. Float and Double read as atof does, in any
+    // locale; a Char is the first character, a Bool AsBool's answer, a Date
+    // CDateTime::ParseDateTime's in the user's default locale, a String the
+    // text. Null or empty text is false except for a String (empty text).
+    // False, changing nothing, for a date that does not parse and any type
+    // not named here.
+    bool Parse(const char* text, VARENUM type);
+
+    // A different tag is never equal, and orders by the tag number alone.
+    // Within a tag: numbers by value (Bool, Byte, UShort and ULong unsigned;
+    // a NaN equals nothing and orders nowhere), text as CString::Compare
+    // does, blobs as CBlob does (equal by content, ordered by buffer); Empty,
+    // Null, Double, Date and Error by the payload read as a double, so Error
+    // codes compare as unsigned numbers.
+    bool operator==(const CGenericVal& other) const;
+    bool operator!=(const CGenericVal& other) const { return !(*this == other); }
+    bool operator<(const CGenericVal& other) const;
+
+protected:
+    // Empties a value of another tag and gives it this one: empty text for a
+    // String, no buffer for a BLOB, a zero payload for anything else.
+    void ChangeType(VARENUM type);
+    CString& GetStringRef();
+    const CString& GetStringRef() const;
+    CBlob& GetBlobRef();
+    const CBlob& GetBlobRef() const;
+
+private:
+    VARENUM m_vt;
+    // The live member is the one of the tag; CString and CBlob are one
+    // pointer each, built and destroyed in place. The double starts out
+    // zero, and with it the whole payload.
+    union {
+        double m_dblVal = 0.0;
+        bool m_boolVal;
+        char m_cVal;
+        unsigned char m_bVal;
+        short m_iVal;
+        unsigned short m_uiVal;
+        LONG m_lVal;
+        ULONG m_ulVal;
+        LONG m_scode;
+        float m_fltVal;
+        CString m_strVal;
+        CBlob m_blobVal;
+    };
 };
 
 // A colour as 0x00BBGGRR: red in bits 0-7, green 8-15, blue 16-23.

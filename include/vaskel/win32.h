@@ -9,6 +9,10 @@
 #include <float.h>
 #include <mbstring.h>
 #include <windows.h>
+// Shell folder paths; not part of windows.h.
+#include <shlobj.h>
+// Process-status services; not part of windows.h.
+#include <psapi.h>
 // Some runtime headers name only the exception masks; the status bits are the same.
 #ifndef _SW_INVALID
 #define _SW_INVALID _EM_INVALID

@@ -1,6 +1,7 @@
 // A private directory for one test, removed with everything in it afterwards.
 #pragma once
 
+#include <algorithm>
 #include <atomic>
 #include <chrono>
 #include <filesystem>
@@ -28,6 +29,12 @@ public:
     // The directory joined with a name by a backslash, as the library builds
     // paths on every platform.
     std::string File(const std::string& name) const { return m_path.string() + "\\" + name; }
+    // The directory with backslashes only, as the library writes whole paths.
+    std::string Win32Path() const {
+        std::string path = m_path.string();
+        std::replace(path.begin(), path.end(), '/', '\\');
+        return path;
+    }
     const std::filesystem::path& Path() const { return m_path; }
 
 private:

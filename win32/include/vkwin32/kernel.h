@@ -28,6 +28,8 @@
 #define FILE_ATTRIBUTE_ARCHIVE 0x00000020
 #define FILE_ATTRIBUTE_NORMAL 0x00000080
 #define FILE_ATTRIBUTE_TEMPORARY 0x00000100
+#define FILE_ATTRIBUTE_REPARSE_POINT 0x00000400
+#define IO_REPARSE_TAG_SYMLINK 0xA000000Cu
 #define INVALID_FILE_ATTRIBUTES 0xFFFFFFFFu
 #define FILE_FLAG_WRITE_THROUGH 0x80000000u
 #define FILE_FLAG_BACKUP_SEMANTICS 0x02000000u
@@ -65,6 +67,23 @@ typedef struct _WIN32_FILE_ATTRIBUTE_DATA {
     DWORD nFileSizeLow;
 } WIN32_FILE_ATTRIBUTE_DATA, *LPWIN32_FILE_ATTRIBUTE_DATA;
 
+// What a directory search reports of one entry. A symbolic link is a reparse
+// point of the kind of what it names (the directory bit for a link to a
+// directory), with its own times, no size and its tag in dwReserved0. There
+// are no short names here.
+typedef struct _WIN32_FIND_DATAA {
+    DWORD dwFileAttributes;
+    FILETIME ftCreationTime;
+    FILETIME ftLastAccessTime;
+    FILETIME ftLastWriteTime;
+    DWORD nFileSizeHigh;
+    DWORD nFileSizeLow;
+    DWORD dwReserved0;
+    DWORD dwReserved1;
+    CHAR cFileName[MAX_PATH];
+    CHAR cAlternateFileName[14];
+} WIN32_FIND_DATAA, *PWIN32_FIND_DATAA, *LPWIN32_FIND_DATAA;
+
 typedef struct _OVERLAPPED OVERLAPPED, *LPOVERLAPPED;
 
 extern "C" {
@@ -99,6 +118,25 @@ BOOL WINAPI GetFileAttributesExA(LPCSTR fileName, GET_FILEEX_INFO_LEVELS infoLev
 DWORD WINAPI GetFileAttributesA(LPCSTR fileName);
 BOOL WINAPI DeleteFileA(LPCSTR fileName);
 BOOL WINAPI MoveFileA(LPCSTR existingFileName, LPCSTR newFileName);
+
+BOOL WINAPI CreateDirectoryA(LPCSTR pathName, LPSECURITY_ATTRIBUTES securityAttributes);
+// Removes an empty directory, or a symbolic link to a directory.
+BOOL WINAPI RemoveDirectoryA(LPCSTR pathName);
+
+// Directory searches. The last part of fileName is a pattern matched without
+// regard to case: '*' stands for any run of characters, '?' for one, and
+// "*.*" for every name, with or without a dot. The entries come in the
+// directory's own order, "." and ".." among them except at the root. A
+// handle that names no search fails with ERROR_INVALID_HANDLE.
+HANDLE WINAPI FindFirstFileA(LPCSTR fileName, LPWIN32_FIND_DATAA findFileData);
+BOOL WINAPI FindNextFileA(HANDLE findFile, LPWIN32_FIND_DATAA findFileData);
+BOOL WINAPI FindClose(HANDLE findFile);
+
+// Without short names both give an existing path as it is. The result is the
+// length copied, or the size needed (NUL included) when the buffer is too
+// small, or 0 on failure.
+DWORD WINAPI GetLongPathNameA(LPCSTR shortPath, LPSTR longPath, DWORD bufferLength);
+DWORD WINAPI GetShortPathNameA(LPCSTR longPath, LPSTR shortPath, DWORD bufferLength);
 
 // Global memory. A fixed block's handle is its address; a movable block's
 // handle stays the same for its whole life and GlobalLock gives its address.

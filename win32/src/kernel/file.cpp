@@ -1,5 +1,6 @@
 // Files through the Win32 file API on POSIX descriptors. Share modes have no
 // POSIX counterpart and are accepted without effect.
+#include "file_status.h"
 #include "handle_table.h"
 #include "posix_path.h"
 
@@ -21,47 +22,6 @@ public:
     ~FileObject() override { ::close(fd); }
     const int fd;
 };
-
-// ENOENT is either a missing file or a missing directory on the way to it;
-// Windows tells the two apart.
-DWORD MissingPathError(const std::string& posix) {
-    std::string::size_type slash = posix.find_last_of('/');
-    if (slash == std::string::npos || slash == 0)
-        return ERROR_FILE_NOT_FOUND;
-    struct stat st;
-    std::string parent = posix.substr(0, slash);
-    if (::stat(parent.c_str(), &st) == 0 && S_ISDIR(st.st_mode))
-        return ERROR_FILE_NOT_FOUND;
-    return ERROR_PATH_NOT_FOUND;
-}
-
-void SetPathError(int error, const std::string& posix) {
-    SetLastError(error == ENOENT ? MissingPathError(posix) : ErrorFromErrno(error));
-}
-
-FILETIME ToFileTime(const struct timespec& ts) {
-    // 100-nanosecond intervals since 1 January 1601.
-    const ULONGLONG epochDifference = 11644473600ull;
-    ULONGLONG ticks = (static_cast<ULONGLONG>(ts.tv_sec) + epochDifference) * 10000000ull +
-                      static_cast<ULONGLONG>(ts.tv_nsec) / 100;
-    FILETIME ft;
-    ft.dwLowDateTime = static_cast<DWORD>(ticks);
-    ft.dwHighDateTime = static_cast<DWORD>(ticks >> 32);
-    return ft;
-}
-
-// A file nobody may write is FILE_ATTRIBUTE_READONLY: it refuses writers and
-// deletion even where POSIX would let the caller through (root).
-bool IsReadOnly(const struct stat& st) {
-    return (st.st_mode & (S_IWUSR | S_IWGRP | S_IWOTH)) == 0;
-}
-
-DWORD AttributesOf(const struct stat& st) {
-    DWORD attributes = S_ISDIR(st.st_mode) ? FILE_ATTRIBUTE_DIRECTORY : FILE_ATTRIBUTE_ARCHIVE;
-    if (IsReadOnly(st))
-        attributes |= FILE_ATTRIBUTE_READONLY;
-    return attributes;
-}
 
 int OpenFlags(DWORD access) {
     bool read = (access & (GENERIC_READ | GENERIC_ALL)) != 0;

@@ -1,5 +1,6 @@
 #include "handle_table.h"
 
+#include "process.h"
 #include "thread.h"
 
 #include <vkwin32/kernel.h>
@@ -38,6 +39,8 @@ HANDLE InsertHandle(std::shared_ptr<KernelObject> object) {
 std::shared_ptr<KernelObject> LookupHandle(HANDLE handle) {
     if (handle == GetCurrentThread())
         return CurrentThreadObject();
+    if (handle == GetCurrentProcess())
+        return CurrentProcessObject();
     HandleTable& table = Table();
     std::lock_guard<std::mutex> lock(table.mutex);
     auto it = table.objects.find(reinterpret_cast<std::uintptr_t>(handle));

@@ -1,6 +1,11 @@
+#include "module.h"
+
+#include "process.h"
+
 #include <vkwin32/kernel.h>
 #include <vkwin32/winreg.h>
 
+#include <dlfcn.h>
 #include <strings.h>
 
 #include <cstring>
@@ -35,6 +40,24 @@ bool IsModuleName(LPCSTR name, const char* baseName) {
 }
 
 } // namespace
+
+namespace vkw32 {
+
+bool ModuleFilePath(HMODULE module, std::string& path) {
+    if (module == nullptr || module == reinterpret_cast<HMODULE>(&programImage))
+        return ProgramPath(GetCurrentProcessId(), path);
+    Dl_info library;
+    if (module == reinterpret_cast<HMODULE>(&advapiImage) &&
+        ::dladdr(reinterpret_cast<void*>(&advapiImage), &library) != 0 &&
+        library.dli_fname != nullptr) {
+        path = library.dli_fname;
+        return true;
+    }
+    SetLastError(ERROR_INVALID_HANDLE);
+    return false;
+}
+
+} // namespace vkw32
 
 extern "C" HMODULE WINAPI GetModuleHandleA(LPCSTR moduleName) {
     if (!moduleName)

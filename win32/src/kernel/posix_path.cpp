@@ -72,6 +72,8 @@ DWORD ErrorFromErrno(int error) {
         return ERROR_IO_DEVICE;
     case EINVAL:
         return ERROR_INVALID_PARAMETER;
+    case ENOEXEC:
+        return ERROR_BAD_EXE_FORMAT;
     default:
         return ERROR_INVALID_FUNCTION;
     }

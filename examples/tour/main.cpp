@@ -6,6 +6,7 @@
 #include <vaskel/framework/list.h>
 #include <vaskel/framework/mem_file.h>
 #include <vaskel/framework/string.h>
+#include <vaskel/fs.h>
 #include <vaskel/namevalue.h>
 #include <vaskel/queue.h>
 #include <vaskel/registry.h>
@@ -14,8 +15,12 @@
 #include <vaskel/timer.h>
 #include <vaskel/value.h>
 
+#include <algorithm>
 #include <cstdio>
+#include <filesystem>
+#include <string>
 #include <thread>
+#include <vector>
 
 using namespace vaskel;
 
@@ -178,6 +183,44 @@ void TourNameValues() {
                 blob.ToString().GetString());
     std::printf("its copy was changed on write; the original still starts with '%c'\n",
                 blob.GetData()[0]);
+}
+
+void TourFiles() {
+    Section("Paths and directory trees");
+    const CPathUrl sample(CString("C:\\tour\\data\\notes.txt"));
+    std::printf("%s: parent '%s', nodes", sample.GetUrl().GetString(),
+                sample.GetParentUrl().GetUrl().GetString());
+    for (POSITION pos = sample.GetFirstNodePosition(); pos;)
+        std::printf(" [%s]", sample.GetNextNodePosition(pos).GetString());
+    std::printf("\n");
+
+    // The library writes paths with backslashes on every platform.
+    std::string temp = std::filesystem::temp_directory_path().string();
+    std::replace(temp.begin(), temp.end(), '/', '\\');
+    const CString name = FileSystem::BuildUniqueDirectoryName(temp.c_str(), "vaskel-tour");
+    CPathUrl root(CString(temp.c_str()));
+    root.AddChild(name);
+    const bool built = FileSystem::PopulateDirectoryTree(root, 1, 2, 1, nullptr, nullptr) &&
+                       FileSystem::CreateEmptyFile(root.GetUrl() + "\\notes.txt");
+    std::printf("a fresh folder in the temporary folder, with 2 directories, a file in each "
+                "and 2 files beside them: %s\n",
+                built ? "yes" : "no");
+    // The search order is the file system's own; sorted, the names read the same everywhere.
+    std::vector<std::string> entries;
+    FileEnumerator walk(root, "*", true);
+    walk.Reset();
+    while (walk.MoveNext()) {
+        const CString relative = walk.Current().GetFilePath().Mid(root.GetUrl().GetLength() + 1);
+        entries.push_back(std::string(relative.GetString()) +
+                          (walk.Current().IsDirectory() ? "\\" : ""));
+    }
+    std::sort(entries.begin(), entries.end());
+    std::printf("enumerated recursively, sorted:\n");
+    for (const std::string& entry : entries)
+        std::printf("  %s\n", entry.c_str());
+    const bool removed = FileSystem::DeleteDirectory(root, false);
+    std::printf("removed with its content: %s; still there: %s\n", removed ? "yes" : "no",
+                FileSystem::DirectoryExists(root) ? "yes" : "no");
 }
 
 void TourTimers() {
@@ -442,6 +485,7 @@ int main(int argc, char* argv[]) {
     TourRegistry();
     TourDatesAndTimes(argc > 1 ? argv[1] : nullptr);
     TourNameValues();
+    TourFiles();
     TourTimers();
     TourTimerController();
     return 0;

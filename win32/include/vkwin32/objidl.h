@@ -2,8 +2,8 @@
 #pragma once
 
 #include "types.h"
+#include "unknwn.h"
 
-struct IUnknown;
 struct IStream;
 struct IStorage;
 

@@ -1,14 +1,13 @@
-// OLE Automation: type codes, strings with a length prefix and variant
-// dates. On this platform the user's and the system's default locales are
-// both en-US.
+// OLE Automation: type codes, strings with a length prefix, variants, safe
+// arrays and variant dates. On this platform the user's and the system's
+// default locales are both en-US.
 #pragma once
 
+#include "oaidl.h"
 #include "types.h"
 #include "winerror.h"
 #include "winnls.h"
 #include "wtypes.h"
-
-typedef double DATE;
 
 // Text conversion flags of the Var* functions.
 #define VAR_TIMEVALUEONLY 0x00000001
@@ -21,15 +20,59 @@ typedef double DATE;
 #define LOCALE_USE_NLS 0x10000000
 
 #define DISP_E_TYPEMISMATCH VKW32_HR(0x80020005)
+#define DISP_E_BADVARTYPE VKW32_HR(0x80020008)
 #define DISP_E_OVERFLOW VKW32_HR(0x8002000A)
+#define DISP_E_BADINDEX VKW32_HR(0x8002000B)
+#define DISP_E_ARRAYISLOCKED VKW32_HR(0x8002000D)
 
 extern "C" {
 
-// A BSTR points just past a 32-bit byte count and is followed by a NUL.
+// A BSTR points just past a 32-bit byte count and is followed by a NUL
+// OLECHAR (after a NUL byte when the count is odd); it may hold NULs. A null
+// BSTR is the empty string. A null text allocates zeroed characters; the
+// reallocations keep the old text where the new one is null, accept a text
+// inside the old string and, failing, leave it as it was. A length that
+// cannot be counted in 32 bits fails.
 BSTR WINAPI SysAllocString(const OLECHAR* text);
 BSTR WINAPI SysAllocStringLen(const OLECHAR* text, UINT length);
+BSTR WINAPI SysAllocStringByteLen(LPCSTR bytes, UINT length);
+INT WINAPI SysReAllocString(BSTR* string, const OLECHAR* text);
+INT WINAPI SysReAllocStringLen(BSTR* string, const OLECHAR* text, UINT length);
 void WINAPI SysFreeString(BSTR text);
 UINT WINAPI SysStringLen(BSTR text);
+UINT WINAPI SysStringByteLen(BSTR text);
+
+// Variants own their strings, interfaces and arrays: clearing frees or
+// releases them, copying duplicates or adds a reference; by-reference values
+// are never owned. A type code that is not a variant's, or a record, which
+// this platform cannot copy, gives DISP_E_BADVARTYPE. A copy that fails
+// leaves the destination as it was.
+void WINAPI VariantInit(VARIANTARG* variant);
+HRESULT WINAPI VariantClear(VARIANTARG* variant);
+HRESULT WINAPI VariantCopy(VARIANTARG* destination, const VARIANTARG* source);
+HRESULT WINAPI VariantCopyInd(VARIANT* destination, const VARIANTARG* source);
+
+// Safe arrays. Indices list the first dimension first and the first index
+// varies fastest. Element and byte counts that overflow 32 bits, upper
+// bounds past the LONG range and records, which this platform cannot copy,
+// are refused.
+SAFEARRAY* WINAPI SafeArrayCreate(VARTYPE vt, UINT dims, SAFEARRAYBOUND* bounds);
+SAFEARRAY* WINAPI SafeArrayCreateVector(VARTYPE vt, LONG lowerBound, ULONG elements);
+HRESULT WINAPI SafeArrayDestroy(SAFEARRAY* array);
+HRESULT WINAPI SafeArrayCopy(SAFEARRAY* array, SAFEARRAY** copy);
+UINT WINAPI SafeArrayGetDim(SAFEARRAY* array);
+UINT WINAPI SafeArrayGetElemsize(SAFEARRAY* array);
+HRESULT WINAPI SafeArrayGetLBound(SAFEARRAY* array, UINT dim, LONG* lowerBound);
+HRESULT WINAPI SafeArrayGetUBound(SAFEARRAY* array, UINT dim, LONG* upperBound);
+HRESULT WINAPI SafeArrayGetVartype(SAFEARRAY* array, VARTYPE* vt);
+HRESULT WINAPI SafeArrayLock(SAFEARRAY* array);
+HRESULT WINAPI SafeArrayUnlock(SAFEARRAY* array);
+HRESULT WINAPI SafeArrayAccessData(SAFEARRAY* array, void** data);
+HRESULT WINAPI SafeArrayUnaccessData(SAFEARRAY* array);
+// A string element is passed as the BSTR, an interface as the pointer,
+// anything else by its address; GetElement writes a copy the caller owns.
+HRESULT WINAPI SafeArrayPutElement(SAFEARRAY* array, LONG* indices, void* value);
+HRESULT WINAPI SafeArrayGetElement(SAFEARRAY* array, LONG* indices, void* value);
 
 // Day 0 is 30 December 1899; a negative value's time of day is the absolute
 // value of its fraction. Times resolve to whole seconds.

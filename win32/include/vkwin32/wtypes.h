@@ -1,4 +1,5 @@
-// The automation type codes of VARIANT and property values.
+// The automation type codes of VARIANT and property values, and the value
+// types that have no C equivalent: booleans, currency and decimals.
 #pragma once
 
 #include "types.h"
@@ -59,3 +60,40 @@ enum VARENUM {
     VT_ILLEGALMASKED = 0xfff,
     VT_TYPEMASK = 0xfff
 };
+
+typedef LONG SCODE;
+
+// True is all bits set, so that bitwise and logical operations agree.
+typedef short VARIANT_BOOL;
+#define VARIANT_TRUE ((VARIANT_BOOL)-1)
+#define VARIANT_FALSE ((VARIANT_BOOL)0)
+
+// Currency: a 64-bit integer scaled by 10,000.
+typedef union tagCY {
+    struct {
+        ULONG Lo;
+        LONG Hi;
+    };
+    LONGLONG int64;
+} CY, *LPCY;
+
+// A 96-bit integer with a sign and a power-of-ten scale (0 to 28).
+typedef struct tagDEC {
+    USHORT wReserved;
+    union {
+        struct {
+            BYTE scale;
+            BYTE sign;
+        };
+        USHORT signscale;
+    };
+    ULONG Hi32;
+    union {
+        struct {
+            ULONG Lo32;
+            ULONG Mid32;
+        };
+        ULONGLONG Lo64;
+    };
+} DECIMAL, *LPDECIMAL;
+#define DECIMAL_NEG ((BYTE)0x80)

@@ -110,21 +110,23 @@ char* Element(SAFEARRAY* array, std::size_t index) {
     return static_cast<char*>(array->pvData) + index * array->cbElements;
 }
 
-// Frees the strings, clears the variants and releases the interfaces.
+// Frees the string, clears the variant or releases the interface an element holds.
+void ClearElement(const SAFEARRAY* array, char* element) {
+    if (array->fFeatures & FADF_BSTR) {
+        SysFreeString(*reinterpret_cast<BSTR*>(element));
+    } else if (array->fFeatures & FADF_VARIANT) {
+        VariantClear(reinterpret_cast<VARIANT*>(element));
+    } else if (IUnknown* item = *reinterpret_cast<IUnknown**>(element)) {
+        item->Release();
+    }
+}
+
 void ClearElements(SAFEARRAY* array) {
     ULONG count = 0;
     if (!(array->fFeatures & kOwnedElements) || !array->pvData || !CountElements(array, count))
         return;
-    for (ULONG i = 0; i < count; ++i) {
-        char* element = Element(array, i);
-        if (array->fFeatures & FADF_BSTR) {
-            SysFreeString(*reinterpret_cast<BSTR*>(element));
-        } else if (array->fFeatures & FADF_VARIANT) {
-            VariantClear(reinterpret_cast<VARIANT*>(element));
-        } else if (IUnknown* item = *reinterpret_cast<IUnknown**>(element)) {
-            item->Release();
-        }
-    }
+    for (ULONG i = 0; i < count; ++i)
+        ClearElement(array, Element(array, i));
 }
 
 void DestroyData(SAFEARRAY* array) {
@@ -354,25 +356,16 @@ HRESULT WINAPI SafeArrayPutElement(SAFEARRAY* array, LONG* indices, void* value)
     hr = SafeArrayLock(array);
     if (FAILED(hr))
         return hr;
-    if (array->fFeatures & FADF_BSTR) {
-        const BSTR text = static_cast<BSTR>(value);
-        BSTR copy = text ? CopyString(text) : nullptr;
-        if (text && !copy) {
-            hr = E_OUTOFMEMORY;
-        } else {
-            SysFreeString(*reinterpret_cast<BSTR*>(element));
-            *reinterpret_cast<BSTR*>(element) = copy;
+    if (array->fFeatures & kOwnedElements) {
+        // Strings and interfaces come by value, variants by address. The copy
+        // is made first, so that a failure leaves the old element in place.
+        const bool byValue = (array->fFeatures & FADF_VARIANT) == 0;
+        alignas(VARIANT) char fresh[sizeof(VARIANT)];
+        hr = CopyElement(array, byValue ? static_cast<const void*>(&value) : value, fresh);
+        if (SUCCEEDED(hr)) {
+            ClearElement(array, element);
+            std::memcpy(element, fresh, byValue ? sizeof(void*) : sizeof(VARIANT));
         }
-    } else if (array->fFeatures & FADF_VARIANT) {
-        hr = VariantCopy(reinterpret_cast<VARIANT*>(element), static_cast<VARIANT*>(value));
-    } else if (array->fFeatures & (FADF_UNKNOWN | FADF_DISPATCH)) {
-        auto* item = static_cast<IUnknown*>(value);
-        if (item)
-            item->AddRef();
-        IUnknown* old = *reinterpret_cast<IUnknown**>(element);
-        *reinterpret_cast<IUnknown**>(element) = item;
-        if (old)
-            old->Release();
     } else {
         std::memcpy(element, value, array->cbElements);
     }

@@ -6,6 +6,8 @@
 //           decode of its own unbroken text into a buffer with room
 #include <vaskel/value.h>
 
+#include "random_bytes.h"
+
 #include <benchmark/benchmark.h>
 #include <boost/beast/core/detail/base64.hpp>
 
@@ -19,18 +21,8 @@ namespace beast64 = boost::beast::detail::base64;
 
 const DWORD inputBytes = 1 << 20;
 
-std::vector<unsigned char> Input() {
-    std::vector<unsigned char> bytes(inputBytes);
-    unsigned int state = 12345;
-    for (unsigned char& byte : bytes) {
-        state = state * 1103515245u + 12345u;
-        byte = static_cast<unsigned char>(state >> 16);
-    }
-    return bytes;
-}
-
 void BM_Encode_VK(benchmark::State& state) {
-    const std::vector<unsigned char> bytes = Input();
+    const std::vector<unsigned char> bytes = RandomBytes(inputBytes);
     const vaskel::CBlob blob(bytes.data(), inputBytes);
     for (auto _ : state) {
         vaskel::CString text = blob.ToString();
@@ -40,7 +32,7 @@ void BM_Encode_VK(benchmark::State& state) {
 }
 
 void BM_Encode_Beast(benchmark::State& state) {
-    const std::vector<unsigned char> bytes = Input();
+    const std::vector<unsigned char> bytes = RandomBytes(inputBytes);
     std::vector<char> text(beast64::encoded_size(inputBytes));
     for (auto _ : state) {
         beast64::encode(text.data(), bytes.data(), inputBytes);
@@ -51,7 +43,7 @@ void BM_Encode_Beast(benchmark::State& state) {
 }
 
 void BM_Decode_VK(benchmark::State& state) {
-    const std::vector<unsigned char> bytes = Input();
+    const std::vector<unsigned char> bytes = RandomBytes(inputBytes);
     const vaskel::CString text = vaskel::CBlob(bytes.data(), inputBytes).ToString();
     vaskel::CBlob blob;
     for (auto _ : state) {
@@ -65,7 +57,7 @@ void BM_Decode_VK(benchmark::State& state) {
 }
 
 void BM_Decode_Beast(benchmark::State& state) {
-    const std::vector<unsigned char> bytes = Input();
+    const std::vector<unsigned char> bytes = RandomBytes(inputBytes);
     std::string text(beast64::encoded_size(inputBytes), '\0');
     beast64::encode(&text[0], bytes.data(), inputBytes);
     std::vector<unsigned char> decoded(beast64::decoded_size(text.size()));

@@ -5,6 +5,8 @@
 //                  hexadecimal digits a byte with no separators
 #include <vaskel/text.h>
 
+#include "random_bytes.h"
+
 #include <benchmark/benchmark.h>
 
 #include <cstddef>
@@ -17,18 +19,8 @@ namespace {
 
 const DWORD dumpBytes = 1 << 20;
 
-std::vector<unsigned char> DumpInput() {
-    std::vector<unsigned char> bytes(dumpBytes);
-    unsigned int state = 12345;
-    for (unsigned char& byte : bytes) {
-        state = state * 1103515245u + 12345u;
-        byte = static_cast<unsigned char>(state >> 16);
-    }
-    return bytes;
-}
-
 void BM_BytesToString_VK(benchmark::State& state) {
-    const std::vector<unsigned char> bytes = DumpInput();
+    const std::vector<unsigned char> bytes = RandomBytes(dumpBytes);
     const DWORD size = vaskel::VKCalcBytesToStringBufferSize(dumpBytes, 4, 8);
     std::vector<char> out(size);
     for (auto _ : state) {
@@ -41,7 +33,7 @@ void BM_BytesToString_VK(benchmark::State& state) {
 
 void BM_BytesToString_Reference(benchmark::State& state) {
     static const char digits[] = "0123456789ABCDEF";
-    const std::vector<unsigned char> bytes = DumpInput();
+    const std::vector<unsigned char> bytes = RandomBytes(dumpBytes);
     std::vector<char> out(2 * static_cast<size_t>(dumpBytes));
     for (auto _ : state) {
         char* p = out.data();

@@ -5,6 +5,8 @@
 #include "types.h"
 #include "winerror.h"
 
+#include <cstdarg>
+
 #define GENERIC_READ 0x80000000u
 #define GENERIC_WRITE 0x40000000u
 #define GENERIC_EXECUTE 0x20000000u
@@ -45,6 +47,18 @@
 #define GMEM_MODIFY 0x0080
 #define GPTR (GMEM_FIXED | GMEM_ZEROINIT)
 #define GHND (GMEM_MOVEABLE | GMEM_ZEROINIT)
+
+#define LMEM_FIXED 0x0000
+#define LMEM_ZEROINIT 0x0040
+#define LPTR (LMEM_FIXED | LMEM_ZEROINIT)
+
+#define FORMAT_MESSAGE_ALLOCATE_BUFFER 0x00000100
+#define FORMAT_MESSAGE_IGNORE_INSERTS 0x00000200
+#define FORMAT_MESSAGE_FROM_STRING 0x00000400
+#define FORMAT_MESSAGE_FROM_HMODULE 0x00000800
+#define FORMAT_MESSAGE_FROM_SYSTEM 0x00001000
+#define FORMAT_MESSAGE_ARGUMENT_ARRAY 0x00002000
+#define FORMAT_MESSAGE_MAX_WIDTH_MASK 0x000000FF
 
 #define CP_ACP 0
 #define CP_OEMCP 1
@@ -148,6 +162,26 @@ LPVOID WINAPI GlobalLock(HGLOBAL memory);
 BOOL WINAPI GlobalUnlock(HGLOBAL memory);
 SIZE_T WINAPI GlobalSize(HGLOBAL memory);
 HGLOBAL WINAPI GlobalHandle(LPCVOID memory);
+
+// Local memory: fixed blocks only, whose handle is their address. Freeing a
+// handle that names no live block fails with ERROR_INVALID_HANDLE and
+// returns the handle.
+HLOCAL WINAPI LocalAlloc(UINT flags, SIZE_T bytes);
+HLOCAL WINAPI LocalFree(HLOCAL memory);
+
+// The system's English message texts for the common error codes, each
+// ending in "\r\n", for the neutral, default and English languages; another
+// language fails with ERROR_RESOURCE_LANG_NOT_FOUND and a code without a
+// text with ERROR_MR_MID_NOT_FOUND. Inserts take their arguments as
+// pointer-sized values (strings unless an insert says "!format!"), from a
+// va_list or, with FORMAT_MESSAGE_ARGUMENT_ARRAY, an array; with neither,
+// a text that has inserts fails with ERROR_INVALID_PARAMETER. Only
+// FORMAT_MESSAGE_FROM_SYSTEM is a source here: the others fail with
+// ERROR_INVALID_PARAMETER. The result counts the characters stored, NUL
+// excluded; with FORMAT_MESSAGE_ALLOCATE_BUFFER, buffer receives a
+// LocalAlloc'ed text of at least size characters, to be freed with LocalFree.
+DWORD WINAPI FormatMessageA(DWORD flags, LPCVOID source, DWORD messageId, DWORD languageId,
+                            LPSTR buffer, DWORD size, va_list* arguments);
 
 UINT WINAPI GetACP(void);
 int WINAPI MultiByteToWideChar(UINT codePage, DWORD flags, LPCSTR multiByteStr, int multiByteCount,

@@ -19,6 +19,24 @@
 #define VAR_FOURDIGITYEARS 0x00000040
 #define LOCALE_USE_NLS 0x10000000
 
+// Flags of VariantChangeType and VariantChangeTypeEx.
+#define VARIANT_NOVALUEPROP 0x01
+#define VARIANT_ALPHABOOL 0x02
+#define VARIANT_NOUSEROVERRIDE 0x04
+#define VARIANT_CALENDAR_HIJRI 0x08
+#define VARIANT_LOCALBOOL 0x10
+
+// Results of VarCmp.
+#define VARCMP_LT 0
+#define VARCMP_EQ 1
+#define VARCMP_GT 2
+#define VARCMP_NULL 3
+
+// The comparison flag of VarCmp (and CompareString).
+#ifndef NORM_IGNORECASE
+#define NORM_IGNORECASE 0x00000001
+#endif
+
 #define DISP_E_TYPEMISMATCH VKW32_HR(0x80020005)
 #define DISP_E_BADVARTYPE VKW32_HR(0x80020008)
 #define DISP_E_OVERFLOW VKW32_HR(0x8002000A)
@@ -102,5 +120,64 @@ INT WINAPI VariantTimeToSystemTime(DOUBLE variantTime, LPSYSTEMTIME systemTime);
 // 100-9999, DISP_E_OVERFLOW. *result is written only on success.
 HRESULT WINAPI VarBstrFromDate(DATE dateIn, LCID lcid, ULONG flags, BSTR* result);
 HRESULT WINAPI VarDateFromStr(LPCOLESTR text, LCID lcid, ULONG flags, DATE* result);
+
+// Type changes between the scalar types (VT_EMPTY, VT_NULL, VT_I1 to VT_UI8,
+// VT_INT, VT_UINT, VT_R4, VT_R8, VT_CY, VT_DATE, VT_BSTR, VT_BOOL,
+// VT_DECIMAL), as the system makes them for en-US; a by-reference source is
+// read through its reference and the destination may be the source. On
+// success the destination's old value is cleared first; on failure it is
+// left as it was. VariantChangeType uses LOCALE_USER_DEFAULT; text in any
+// other locale than those of VarBstrFromDate gives E_INVALIDARG.
+//
+// VT_EMPTY becomes 0, "" or false; VT_NULL changes only to VT_NULL (to
+// anything else: DISP_E_TYPEMISMATCH); every value but an error becomes
+// VT_EMPTY or VT_NULL, and VT_ERROR changes only to itself. Fractions round half to
+// even, to whole numbers for the integer types and to four decimals for
+// VT_CY; a value outside the target's range gives DISP_E_OVERFLOW, except
+// that integers of the same width change sign by their bits (VT_I4 -1 is
+// VT_UI4 0xFFFFFFFF) and VT_BOOL true is all bits set in every unsigned
+// type. VT_BOOL true is -1 (a true stored as 1 reads as 1). VT_DATE holds days -657434 to 2958465.
+// Doubles become decimals through their 15 significant digits (floats
+// through 7), as the system does, and past 2^53 with all their digits;
+// currency and decimals change exactly, and to doubles correctly rounded. A
+// decimal with a scale past 28 gives E_INVALIDARG.
+//
+// Text: integers in decimal; VT_R8 with up to 15 significant digits and
+// VT_R4 with up to 7, without trailing zeros, in exponent form ("1E+15",
+// "1.5E-05") from 10^15 (10^7) and below 10^-4; VT_CY and VT_DECIMAL with
+// all their digits; VT_DATE through VarBstrFromDate; VT_BOOL as "-1" and
+// "0", or "True" and "False" with VARIANT_ALPHABOOL or VARIANT_LOCALBOOL.
+// Numbers are read between blanks with a sign before or after them (or
+// parentheses for a negative), a leading "$", "," between the integer
+// digits, a "." and an exponent ("1e3"), or as "&H" hexadecimal or "&O"
+// octal, which fill the target's bits (&HFFFF is VT_I2 -1); other text
+// gives DISP_E_TYPEMISMATCH, a hexadecimal past 64 bits DISP_E_OVERFLOW.
+// VT_BOOL also reads "True" and "False" (or "#TRUE#", "#FALSE#") in any
+// case; VT_DATE reads through VarDateFromStr. VARIANT_NOVALUEPROP,
+// VARIANT_NOUSEROVERRIDE and VARIANT_CALENDAR_HIJRI change nothing here
+// (dates print and read in the Gregorian calendar).
+//
+// VT_UNKNOWN and VT_DISPATCH change into each other through QueryInterface.
+// A VT_DISPATCH would need IDispatch::Invoke for its value, which this
+// platform does not call: changing it to any type but the interfaces,
+// VT_EMPTY and VT_NULL gives DISP_E_TYPEMISMATCH. Arrays, records and
+// by-reference destinations give DISP_E_TYPEMISMATCH; a type code that is no
+// variant's, DISP_E_BADVARTYPE.
+HRESULT WINAPI VariantChangeType(VARIANTARG* dest, const VARIANTARG* src, USHORT flags, VARTYPE vt);
+HRESULT WINAPI VariantChangeTypeEx(VARIANTARG* dest, const VARIANTARG* src, LCID lcid, USHORT flags,
+                                   VARTYPE vt);
+
+// Compares two variants: VARCMP_NULL when either is VT_NULL; numbers of any
+// types, VT_BOOL as -1 and 0, VT_DATE as its days and VT_EMPTY as 0, by
+// value (integers exactly; a VT_R4 against a VT_R8 as floats, as the system
+// does); a number is less than any text; texts and VT_EMPTY (as "") by their
+// UTF-16 code units, with NORM_IGNORECASE folding A-Z and the Latin-1
+// letters (the system compares linguistically: "a" < "B" there, not here);
+// two VT_ERRORs by their codes. By-reference operands are read through
+// their references. VT_ERROR against anything else, interfaces and
+// VT_VARIANT give DISP_E_TYPEMISMATCH; arrays, records and type codes that
+// are no variant's, DISP_E_BADVARTYPE; texts in a locale unknown to
+// VarBstrFromDate, E_INVALIDARG.
+HRESULT WINAPI VarCmp(LPVARIANT left, LPVARIANT right, LCID lcid, ULONG flags);
 
 } // extern "C"

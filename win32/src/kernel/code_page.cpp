@@ -52,6 +52,19 @@ extern "C" int WINAPI MultiByteToWideChar(UINT codePage, DWORD flags, LPCSTR mul
     int needed = 0;
     bool overflow = false;
     for (int i = 0; i < length;) {
+        // ASCII, by far the most common text, maps byte for unit.
+        if (text[i] < 0x80) {
+            if (wideCharCount != 0) {
+                if (needed >= wideCharCount) {
+                    overflow = true;
+                    break;
+                }
+                wideCharStr[needed] = static_cast<char16_t>(text[i]);
+            }
+            ++needed;
+            ++i;
+            continue;
+        }
         char32_t cp;
         if (!vkw32::DecodeUtf8(text, length, i, cp)) {
             if (flags & MB_ERR_INVALID_CHARS) {

@@ -13,6 +13,8 @@
 #include <shlobj.h>
 // Process-status services; not part of windows.h.
 #include <psapi.h>
+// The compiler's COM support types: _bstr_t, _variant_t, _com_error.
+#include <comdef.h>
 // Some runtime headers name only the exception masks; the status bits are the same.
 #ifndef _SW_INVALID
 #define _SW_INVALID _EM_INVALID
@@ -30,5 +32,6 @@
 #define _SW_INEXACT _EM_INEXACT
 #endif
 #else
+#include <vkwin32/comdef.h>
 #include <vkwin32/windows.h>
 #endif

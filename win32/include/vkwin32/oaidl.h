@@ -5,6 +5,7 @@
 
 #include "types.h"
 #include "unknwn.h"
+#include "winnls.h"
 #include "wtypes.h"
 
 typedef double DATE;
@@ -106,3 +107,38 @@ struct tagVARIANT {
         DECIMAL decVal;
     };
 };
+
+typedef LONG DISPID;
+typedef DISPID MEMBERID;
+struct ITypeInfo;
+
+typedef struct tagDISPPARAMS {
+    VARIANTARG* rgvarg;
+    DISPID* rgdispidNamedArgs;
+    UINT cArgs;
+    UINT cNamedArgs;
+} DISPPARAMS;
+
+typedef struct tagEXCEPINFO {
+    WORD wCode;
+    WORD wReserved;
+    BSTR bstrSource;
+    BSTR bstrDescription;
+    BSTR bstrHelpFile;
+    DWORD dwHelpContext;
+    PVOID pvReserved;
+    HRESULT(STDMETHODCALLTYPE* pfnDeferredFillIn)(struct tagEXCEPINFO*);
+    SCODE scode;
+} EXCEPINFO, *LPEXCEPINFO;
+
+// Late-bound access to an object's members by dispatch identifier.
+struct IDispatch : IUnknown {
+    virtual HRESULT STDMETHODCALLTYPE GetTypeInfoCount(UINT* count) = 0;
+    virtual HRESULT STDMETHODCALLTYPE GetTypeInfo(UINT index, LCID lcid, ITypeInfo** info) = 0;
+    virtual HRESULT STDMETHODCALLTYPE GetIDsOfNames(REFIID iid, LPOLESTR* names, UINT count,
+                                                    LCID lcid, DISPID* ids) = 0;
+    virtual HRESULT STDMETHODCALLTYPE Invoke(DISPID id, REFIID iid, LCID lcid, WORD flags,
+                                             DISPPARAMS* params, VARIANT* result,
+                                             EXCEPINFO* exception, UINT* argumentError) = 0;
+};
+typedef IDispatch* LPDISPATCH;

@@ -1,5 +1,5 @@
 // Values: the shared byte blob, the tagged generic value with its type tag,
-// colours and rectangles.
+// the owning variant, safe-array views, colours and rectangles.
 #pragma once
 
 #include <vaskel/calendar.h>
@@ -333,6 +333,290 @@ private:
         CString m_strVal;
         CBlob m_blobVal;
     };
+};
+
+// An automation VARIANT that owns what it holds: cleared on destruction,
+// deep-copied on copy, built from and assigned every scalar, string, date,
+// decimal and interface type. Failures throw _com_error with the HRESULT.
+//
+// The integer overloads follow the native types: int gives VT_INT and long
+// VT_I4, so where LONG is an int (POSIX) a LONG gives VT_INT and a DWORD
+// VT_UINT; a long or unsigned long beyond 32 bits throws DISP_E_OVERFLOW.
+class VASKEL_API orvariant_t : public VARIANT {
+public:
+    orvariant_t() noexcept { VariantInit(this); }
+    orvariant_t(const orvariant_t& source);
+    orvariant_t(const VARIANT& source);
+    orvariant_t(const _variant_t& source);
+    // A null pointer throws E_POINTER.
+    orvariant_t(const VARIANT* source);
+    // Without copy the wrapper takes source over and leaves it VT_EMPTY.
+    orvariant_t(VARIANT& source, bool copy);
+    // VT_I2, or VT_BOOL (-1 for any non-zero value); any other type E_INVALIDARG.
+    orvariant_t(short value, VARTYPE type = VT_I2);
+    // VT_I4, VT_ERROR or VT_BOOL; any other type E_INVALIDARG.
+    orvariant_t(long value, VARTYPE type = VT_I4);
+    orvariant_t(float value) noexcept;
+    // VT_R8 or VT_DATE; any other type E_INVALIDARG.
+    orvariant_t(double value, VARTYPE type = VT_R8);
+    orvariant_t(const CDateTime& value) noexcept;
+    orvariant_t(const CY& value) noexcept;
+    // A null text gives a null string.
+    orvariant_t(const OLECHAR* value);
+    orvariant_t(const char* value);
+    orvariant_t(const _bstr_t& value);
+    orvariant_t(IDispatch* value, bool addRef = true) noexcept;
+    orvariant_t(IUnknown* value, bool addRef = true) noexcept;
+    orvariant_t(bool value) noexcept;
+    orvariant_t(const DECIMAL& value) noexcept;
+    orvariant_t(unsigned char value) noexcept;
+    orvariant_t(char value) noexcept;
+    orvariant_t(unsigned short value) noexcept;
+    orvariant_t(unsigned long value);
+    orvariant_t(int value) noexcept;
+    orvariant_t(unsigned int value) noexcept;
+    orvariant_t(long long value) noexcept;
+    orvariant_t(unsigned long long value) noexcept;
+    ~orvariant_t() { VariantClear(this); }
+
+    orvariant_t& operator=(const orvariant_t& source);
+    orvariant_t& operator=(const VARIANT& source);
+    orvariant_t& operator=(const _variant_t& source);
+    orvariant_t& operator=(const VARIANT* source);
+    // Into VT_BOOL a short stays a VT_BOOL; a long does too, and into
+    // VT_ERROR a long stays an error code.
+    orvariant_t& operator=(short value);
+    orvariant_t& operator=(long value);
+    // Into VT_DATE a double stays a date.
+    orvariant_t& operator=(double value);
+    orvariant_t& operator=(float value);
+    orvariant_t& operator=(const CDateTime& value);
+    orvariant_t& operator=(const CY& value);
+    orvariant_t& operator=(bool value);
+    orvariant_t& operator=(const DECIMAL& value);
+    orvariant_t& operator=(unsigned char value);
+    orvariant_t& operator=(char value);
+    orvariant_t& operator=(unsigned short value);
+    orvariant_t& operator=(unsigned long value);
+    orvariant_t& operator=(int value);
+    orvariant_t& operator=(unsigned int value);
+    orvariant_t& operator=(long long value);
+    orvariant_t& operator=(unsigned long long value);
+    orvariant_t& operator=(const OLECHAR* value);
+    orvariant_t& operator=(const char* value);
+    orvariant_t& operator=(const _bstr_t& value);
+    orvariant_t& operator=(IDispatch* value);
+    orvariant_t& operator=(IUnknown* value);
+
+    operator VARIANT*() noexcept { return this; }
+    operator const VARIANT*() const noexcept { return this; }
+
+    // Releases the content and takes source over, leaving it VT_EMPTY.
+    void TransferOwnership(VARIANT& source);
+
+    // The held string or interface, without a new reference; null for any
+    // other type, or DISP_E_TYPEMISMATCH when mustMatch is set. GetIUnknown
+    // also gives a dispatch interface.
+    BSTR GetBSTR(bool mustMatch = false) const;
+    IDispatch* GetIDispatch(bool mustMatch = false) const;
+    IUnknown* GetIUnknown(bool mustMatch = false) const;
+
+    // The numeric value (a Bool as -1 or 0); 0 for text, currency, decimals,
+    // interfaces, arrays and references. The integral forms truncate toward
+    // zero and keep the low 32 bits.
+    double GetAsDouble() const;
+    LONG GetAsIntegral() const;
+    LONG GetAsSignedIntegral() const { return GetAsIntegral(); }
+    DWORD GetAsUnsignedIntegral() const;
+
+    // A string's ANSI text; empty for every other type.
+    CString GetAsString() const;
+    // A string's ANSI text, or the value converted to text by the system.
+    CString ToString() const;
+
+    bool IsNumeric() const { return Type().IsNumeric(); }
+    bool IsIntegral() const { return Type().IsIntegral(); }
+    bool IsSignedIntegral() const { return Type().IsSignedIntegral(); }
+    bool IsUnsignedIntegral() const { return Type().IsUnsignedIntegral(); }
+    bool IsFloatingPoint() const { return Type().IsFloatingPoint(); }
+    bool IsString() const { return Type().IsText(); }
+
+    // True only when the system's comparison says less than; equal, greater,
+    // a null operand and errors give false.
+    bool operator<(const orvariant_t& other) const;
+
+private:
+    VarTypeX Type() const { return VarTypeX(static_cast<VARENUM>(vt)); }
+    // Clears unless the type is already this one, then sets it.
+    void Retype(VARTYPE type);
+    void SetString(BSTR owned);
+};
+
+// A one-byte true, false or unknown; false < true < unknown.
+class tristate_bool {
+public:
+    tristate_bool() noexcept : m_value(kUnknown) {}
+    tristate_bool(bool value) noexcept : m_value(value ? kTrue : kFalse) {}
+    tristate_bool& operator=(bool value) noexcept {
+        m_value = value ? kTrue : kFalse;
+        return *this;
+    }
+
+    static tristate_bool True() noexcept { return tristate_bool(true); }
+    static tristate_bool False() noexcept { return tristate_bool(false); }
+    static tristate_bool Unknown() noexcept { return tristate_bool(); }
+
+    void SetAsTrue() noexcept { m_value = kTrue; }
+    void SetAsFalse() noexcept { m_value = kFalse; }
+    void SetAsUnknown() noexcept { m_value = kUnknown; }
+
+    bool IsTrue() const noexcept { return m_value == kTrue; }
+    bool IsFalse() const noexcept { return m_value == kFalse; }
+    bool IsUnknown() const noexcept { return m_value == kUnknown; }
+    operator bool() const noexcept { return IsTrue(); }
+
+    bool operator==(const tristate_bool& other) const noexcept { return m_value == other.m_value; }
+    bool operator!=(const tristate_bool& other) const noexcept { return m_value != other.m_value; }
+    // An unknown value equals false here.
+    bool operator==(bool value) const noexcept { return IsTrue() == value; }
+    bool operator!=(bool value) const noexcept { return IsTrue() != value; }
+    bool operator<(const tristate_bool& other) const noexcept { return m_value < other.m_value; }
+
+private:
+    static constexpr unsigned char kFalse = 0;
+    static constexpr unsigned char kTrue = 1;
+    static constexpr unsigned char kUnknown = 255;
+
+    unsigned char m_value;
+};
+
+// A VARIANT that releases nothing: a view of a value owned elsewhere.
+struct tmpvariant_t : public VARIANT {
+    tmpvariant_t() noexcept { VariantInit(this); }
+};
+
+// How a safearrayvector holds the VARIANT it shows.
+enum EVariantOwnershipOptions {
+    // A bitwise copy of the caller's VARIANT, never released: the caller
+    // keeps it alive and unchanged while the vector shows it.
+    OwnershipBorrow = 1,
+    // A deep copy, released by the vector.
+    OwnershipCopy = 2,
+    // The caller's VARIANT is taken over and reset to empty; refused for a
+    // VARIANT passed as const.
+    OwnershipTake = 3,
+    // As OwnershipTake, accepted for a VARIANT passed as const as well.
+    OwnershipTakeConst = 4
+};
+
+class safearrayvector;
+
+// A bidirectional walk over a safearrayvector; its element is a view valid
+// while the vector holds the same VARIANT. Moves stop at the first element
+// and at the end.
+class VASKEL_API const_safearrayiterator {
+public:
+    explicit const_safearrayiterator(const safearrayvector* vector);
+
+    const tmpvariant_t& operator*() const { return m_current; }
+    const tmpvariant_t* operator->() const { return &m_current; }
+    const_safearrayiterator& operator++() { return Move(1); }
+    const_safearrayiterator& operator--() { return Move(-1); }
+    const_safearrayiterator operator++(int);
+    const_safearrayiterator operator--(int);
+    // These move the iterator itself.
+    const_safearrayiterator& operator+(int n) { return Move(n); }
+    const_safearrayiterator& operator-(int n) { return Move(-static_cast<long long>(n)); }
+
+    bool operator==(const const_safearrayiterator& other) const {
+        return m_vector == other.m_vector && m_index == other.m_index;
+    }
+    bool operator!=(const const_safearrayiterator& other) const { return !(*this == other); }
+    DWORD GetIndex() const { return m_index; }
+
+private:
+    friend class safearrayvector;
+    const_safearrayiterator& Move(long long n);
+    // Throws _com_error for an element type the vector cannot show.
+    void Refresh();
+
+    const safearrayvector* m_vector;
+    DWORD m_index;
+    tmpvariant_t m_current;
+};
+
+// A read-only vector view of a VARIANT holding a one-dimensional SAFEARRAY
+// (of a multi-dimensional one, its first column); a single value shows as a
+// vector of one. The array's data stays locked while the vector holds it.
+//
+// Elements of VT_VARIANT arrays are shown as the element VARIANT itself.
+// Arrays held by reference are refused (E_INVALIDARG), as are arrays whose
+// element size does not match their type. Interfaces and strings take a
+// pointer each, so those elements are pointer-sized.
+class VASKEL_API safearrayvector {
+public:
+    safearrayvector() noexcept;
+    safearrayvector(VARIANT& value, EVariantOwnershipOptions ownership);
+    // Holds nothing for OwnershipTake.
+    safearrayvector(const VARIANT& value, EVariantOwnershipOptions ownership);
+    // A copy borrows what a borrowing vector borrows and deep-copies what an
+    // owning vector owns, so every VARIANT is released once.
+    safearrayvector(const safearrayvector& other);
+    safearrayvector& operator=(const safearrayvector& other);
+    ~safearrayvector() { Reset(); }
+
+    // Unlocks the array, releases an owned VARIANT and holds nothing.
+    void Reset();
+    // E_INVALIDARG for an empty VARIANT or an unknown option; any failure
+    // keeps what the vector held.
+    HRESULT Set(VARIANT& value, EVariantOwnershipOptions ownership);
+    // E_INVALIDARG for OwnershipTake.
+    HRESULT Set(const VARIANT& value, EVariantOwnershipOptions ownership);
+
+    DWORD size() const { return m_size; }
+    bool empty() const { return m_size == 0; }
+    // The element type of an array, or the type of a single value.
+    VARTYPE GetArrayType() const { return static_cast<VARTYPE>(m_variant.vt & ~VT_ARRAY); }
+
+    // An index at or past the end gives an empty VARIANT.
+    tmpvariant_t at(DWORD index) const;
+    tmpvariant_t operator[](DWORD index) const { return at(index); }
+    tmpvariant_t front() const { return at(0); }
+    tmpvariant_t back() const { return at(m_size ? m_size - 1 : 0); }
+    const_safearrayiterator begin() const { return const_safearrayiterator(this); }
+    const_safearrayiterator end() const;
+
+    // Whether the vector owns what it holds (copied or taken).
+    bool CanTransferElementOwnership() const;
+    // Moves element index into out (cleared first) and empties its slot;
+    // E_UNEXPECTED (thrown) past the end or when the vector only borrows.
+    void TransferElementOwnership(DWORD index, VARIANT& out);
+
+    // Raw elements by element type: 1, 2, 4 or 8 bytes, pointer-sized
+    // strings and interfaces, 16-byte decimals, VARIANTs. Other types are
+    // unsupported: size 0, false, E_NOTIMPL.
+    //
+    // Makes out a VARIANT of type holding the element: a copy (out cleared
+    // first), or a bitwise view that overwrites out without clearing it.
+    static HRESULT SetVariantValue(VARIANT& out, VARTYPE type, void* element, bool copy);
+    // Stores in's value into the element without releasing what the element
+    // held: a copy, or in's content itself, after which in is empty.
+    static HRESULT GetVariantValue(void* element, VARIANT& in, bool copy);
+    static HRESULT GetVariantValue(void* element, const VARIANT& in);
+    static DWORD GetDataSize(VARTYPE type);
+    // Zeroes the element (an empty VARIANT for VT_VARIANT); E_NOTIMPL for
+    // decimals and unsupported types.
+    static HRESULT ResetDataValue(VARTYPE type, void* element);
+    static bool MoveDataPointer(VARTYPE type, void*& element, LONG n);
+
+private:
+    friend class const_safearrayiterator;
+    void* ElementAt(DWORD index) const;
+
+    EVariantOwnershipOptions m_ownership;
+    VARIANT m_variant;
+    DWORD m_size;
+    void* m_data;
 };
 
 // A colour as 0x00BBGGRR: red in bits 0-7, green 8-15, blue 16-23.

@@ -1,4 +1,5 @@
-// Text: value conversions, bounded substring search, string-buffer helpers,
+// Text: value conversions (numbers, variants, GUIDs and ProgIDs, locale
+// and error texts), bounded substring search, string-buffer helpers,
 // delimited token lists, a tokenizer, string vectors, path names and byte
 // dumps.
 #pragma once
@@ -74,12 +75,23 @@ VASKEL_API CString AsString(float value, const char* format);
 VASKEL_API CString& AsString(CString& out, void* value);
 VASKEL_API CString AsString(void* value);
 
+// A VT_BSTR variant's text in the ANSI code page; empty for any other type,
+// a string held by reference included.
+VASKEL_API CString& AsString(CString& out, const VARIANT& value);
+VASKEL_API CString AsString(const VARIANT& value);
+// "{XXXXXXXX-XXXX-XXXX-XXXX-XXXXXXXXXXXX}" in upper case.
+VASKEL_API CString& AsString(CString& out, const GUID& value);
+VASKEL_API CString AsString(const GUID& value);
+
 // Text to values. AsInteger and AsULong read at most length characters
 // (stopping at a NUL), as the runtime's atoi and atol do, saturating at the
 // 32-bit limits; AsULong answers the signed result's bit pattern.
 VASKEL_API bool AsBool(const char* text);
 VASKEL_API int AsInteger(const char* text, DWORD length);
 VASKEL_API DWORD AsULong(const char* text, DWORD length);
+// A VT_UI4 variant's value, or the value converted to VT_UI4 by the system;
+// false, with out untouched, when it cannot be converted.
+VASKEL_API bool AsULong(const VARIANT& value, DWORD& out);
 // The float rounded to about seven significant digits.
 VASKEL_API double AsCleanDouble(float value);
 VASKEL_API double AsDouble(float value);
@@ -87,6 +99,59 @@ VASKEL_API double AsDouble(float value);
 // Rounding with halves away from zero; NaN gives 0.
 VASKEL_API double VKRoundFloat(double value);
 VASKEL_API double VKRoundFloat(double value, LONG places);
+
+// -1, 0 or 1 comparing the code units of the whole lengths, embedded NULs
+// included; a null string is empty.
+VASKEL_API int VKCompareBSTR(BSTR left, BSTR right);
+
+// Locale information (the system's GetLocaleInfoA through a buffer that
+// grows as needed). False or empty text on failure, the output untouched.
+VASKEL_API bool GetLocaleInfoA(DWORD locale, DWORD type, CString& out);
+VASKEL_API CString GetLocaleInfoA(DWORD locale, DWORD type);
+// The English name of the locale's currency.
+VASKEL_API bool GetCurrencyName(DWORD locale, CString& out);
+VASKEL_API CString GetCurrencyName(DWORD locale);
+// The system's text for a Win32 error code, its line break included; empty
+// for a code without one.
+VASKEL_API CString KXFormatErrorMessage(DWORD code);
+
+// --- GUIDs, their text and ProgIDs
+
+// The checked forms answer the system's HRESULT and write their output only
+// on success (the GUID forms hand the GUID to the system, which may write it
+// on failure too). The throwing forms raise COleException with the failing
+// HRESULT. 8-bit text is converted from the thread's ANSI code page; a null
+// or unconvertible text reaches the system as a null pointer.
+VASKEL_API HRESULT AsGUIDFromGuidString(const OLECHAR* text, GUID& out);
+VASKEL_API HRESULT AsGUIDFromGuidString(const char* text, GUID& out);
+VASKEL_API GUID AsGUIDFromGuidString(const OLECHAR* text);
+VASKEL_API GUID AsGUIDFromGuidString(const char* text);
+VASKEL_API HRESULT AsGUIDFromProgID(const OLECHAR* progId, GUID& out);
+VASKEL_API HRESULT AsGUIDFromProgID(const char* progId, GUID& out);
+VASKEL_API GUID AsGUIDFromProgID(const OLECHAR* progId);
+VASKEL_API GUID AsGUIDFromProgID(const char* progId);
+// A GUID string, or failing that a ProgID.
+VASKEL_API HRESULT AsGUID(const OLECHAR* text, GUID& out);
+VASKEL_API HRESULT AsGUID(const char* text, GUID& out);
+VASKEL_API GUID AsGUID(const OLECHAR* text);
+VASKEL_API GUID AsGUID(const char* text);
+VASKEL_API HRESULT AsProgID(const GUID& clsid, CString& out);
+VASKEL_API CString AsProgID(const GUID& clsid);
+VASKEL_API HRESULT AsProgIDFromGuidString(const OLECHAR* text, CString& out);
+VASKEL_API HRESULT AsProgIDFromGuidString(const char* text, CString& out);
+VASKEL_API CString AsProgIDFromGuidString(const OLECHAR* text);
+VASKEL_API CString AsProgIDFromGuidString(const char* text);
+// The ProgID of a registered GUID string; any other text is taken to be a
+// ProgID already and comes back as it is. Never fails.
+VASKEL_API HRESULT AsProgID(const OLECHAR* text, CString& out);
+VASKEL_API HRESULT AsProgID(const char* text, CString& out);
+VASKEL_API CString AsProgID(const OLECHAR* text);
+VASKEL_API CString AsProgID(const char* text);
+// The GUID string of a ProgID's class; E_UNEXPECTED when it has no text.
+VASKEL_API HRESULT AsGUIDStringFromProgID(const OLECHAR* progId, CString& out);
+VASKEL_API HRESULT AsGUIDStringFromProgID(const char* progId, CString& out);
+VASKEL_API CString AsGUIDStringFromProgID(const OLECHAR* progId);
+VASKEL_API CString AsGUIDStringFromProgID(const char* progId);
 
 // --- Delimited token lists
 

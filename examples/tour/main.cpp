@@ -153,6 +153,77 @@ void TourValuesAndText() {
     std::printf("copied into 6 bytes: '%s'\n", buffer);
 }
 
+// Runs the registry tool that is built beside the tour; true when it succeeds.
+bool RunRegistryTool(const std::string& arguments) {
+    std::printf("vaskel-reg %s\n", arguments.c_str());
+    // The tool writes to the same output: ours goes first.
+    std::fflush(stdout);
+    std::string command(Process::GetModulePath(nullptr).GetString());
+    command.erase(command.find_last_of("\\/") + 1);
+    command = "\"" + command + "vaskel-reg\" " + arguments;
+    STARTUPINFOA startup{};
+    startup.cb = sizeof startup;
+    PROCESS_INFORMATION process{};
+    if (!CreateProcessA(nullptr, &command[0], nullptr, nullptr, FALSE, 0, nullptr, nullptr,
+                        &startup, &process))
+        return false;
+    WaitForSingleObject(process.hProcess, INFINITE);
+    DWORD exitCode = 1;
+    GetExitCodeProcess(process.hProcess, &exitCode);
+    CloseHandle(process.hThread);
+    CloseHandle(process.hProcess);
+    return exitCode == 0;
+}
+
+void TourAutomationValues() {
+    Section("Automation values");
+    const orvariant_t values[] = {orvariant_t(42L), orvariant_t(-2.5), orvariant_t(true),
+                                  orvariant_t(CDateTime(2024, 2, 29, 13, 45, 10)),
+                                  orvariant_t("text")};
+    for (const orvariant_t& value : values)
+        std::printf("%s as text: '%s'\n", VarTypeX::ToString(value.vt),
+                    value.ToString().GetString());
+
+    orvariant_t number("1,234.5");
+    orvariant_t date("March 1, 2024");
+    const bool converted = VariantChangeType(number, number, 0, VT_R8) == S_OK &&
+                           VariantChangeType(date, date, 0, VT_DATE) == S_OK;
+    std::printf("'1,234.5' reads back as the double %.1f, 'March 1, 2024' as the date %s: %s\n",
+                number.dblVal, CDateTime(date.date).ToString().GetString(),
+                converted ? "converted" : "failed");
+    std::printf("1 < 2.5 as variants: %s; 'apple' < 'banana': %s\n",
+                orvariant_t(1L) < orvariant_t(2.5) ? "yes" : "no",
+                orvariant_t("apple") < orvariant_t("banana") ? "yes" : "no");
+
+    orvariant_t array;
+    array.parray = SafeArrayCreateVector(VT_I4, 1, 3);
+    array.vt = VT_ARRAY | VT_I4;
+    for (LONG index = 1; index <= 3; ++index) {
+        LONG square = index * index;
+        SafeArrayPutElement(array.parray, &index, &square);
+    }
+    const safearrayvector vector(array, OwnershipBorrow);
+    std::printf("a safe array from index 1 as a vector of %u:",
+                static_cast<unsigned>(vector.size()));
+    for (const_safearrayiterator it = vector.begin(); it != vector.end(); ++it)
+        std::printf(" %d", static_cast<int>((*it).lVal));
+    std::printf("\n");
+
+    const char clsid[] = "{6B29FC40-CA47-1067-B31D-00DD010662DA}";
+    const bool registered =
+        RunRegistryTool(std::string("add HKCR\\VaskelTour.Greeter\\CLSID /ve /d ") + clsid + " /f") &&
+        RunRegistryTool(std::string("add HKCR\\CLSID\\") + clsid + "\\ProgID /ve /d VaskelTour.Greeter /f");
+    std::printf("the registry tool registered VaskelTour.Greeter: %s\n", registered ? "yes" : "no");
+    std::printf("VaskelTour.Greeter names the class %s, whose ProgID is %s\n",
+                AsGUIDStringFromProgID("VaskelTour.Greeter").GetString(),
+                AsProgID(AsGUID("VaskelTour.Greeter")).GetString());
+    RunRegistryTool("delete HKCR\\VaskelTour.Greeter /f");
+    RunRegistryTool(std::string("delete HKCR\\CLSID\\") + clsid + " /f");
+    CString name;
+    std::printf("once deleted, AsProgID of the GUID text gives it back unchanged: %s\n",
+                AsProgID(clsid, name) == S_OK && name == clsid ? "yes" : "no");
+}
+
 void TourNameValues() {
     Section("Name-value lists and blobs");
     CVKNameValueVector pairs;
@@ -488,5 +559,6 @@ int main(int argc, char* argv[]) {
     TourFiles();
     TourTimers();
     TourTimerController();
+    TourAutomationValues();
     return 0;
 }

@@ -28,47 +28,7 @@ HRESULT Read(const VARIANT& operand, VARIANT* value) {
             return E_INVALIDARG;
         return Read(inner, value);
     }
-    *value = VARIANT{};
-    switch (base) {
-    case VT_DECIMAL:
-        value->decVal = *operand.pdecVal;
-        break;
-    case VT_I1:
-    case VT_UI1:
-        value->bVal = *operand.pbVal;
-        break;
-    case VT_I2:
-    case VT_UI2:
-    case VT_BOOL:
-        value->iVal = *operand.piVal;
-        break;
-    case VT_I4:
-    case VT_UI4:
-    case VT_R4:
-    case VT_ERROR:
-    case VT_INT:
-    case VT_UINT:
-        value->lVal = *operand.plVal;
-        break;
-    case VT_BSTR:
-        value->bstrVal = *operand.pbstrVal;
-        break;
-    case VT_UNKNOWN:
-    case VT_DISPATCH:
-        value->punkVal = *operand.ppunkVal;
-        break;
-    case VT_I8:
-    case VT_UI8:
-    case VT_R8:
-    case VT_CY:
-    case VT_DATE:
-        value->llVal = *operand.pllVal;
-        break;
-    default:
-        return DISP_E_BADVARTYPE;
-    }
-    value->vt = base;
-    return S_OK;
+    return LoadReferenced(operand, value);
 }
 
 Class ClassOf(VARTYPE vt) {

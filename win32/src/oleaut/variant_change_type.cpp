@@ -135,43 +135,9 @@ HRESULT ReadSource(const VARIANT& source, VARIANT* value) {
             return E_INVALIDARG;
         return ReadSource(inner, value);
     }
-    *value = VARIANT{};
-    switch (base) {
-    case VT_DECIMAL:
-        value->decVal = *source.pdecVal;
-        break;
-    case VT_I1:
-    case VT_UI1:
-        value->bVal = *source.pbVal;
-        break;
-    case VT_I2:
-    case VT_UI2:
-    case VT_BOOL:
-        value->iVal = *source.piVal;
-        break;
-    case VT_I4:
-    case VT_UI4:
-    case VT_R4:
-    case VT_ERROR:
-    case VT_INT:
-    case VT_UINT:
-        value->lVal = *source.plVal;
-        break;
-    case VT_BSTR:
-        value->bstrVal = *source.pbstrVal;
-        break;
-    case VT_UNKNOWN:
-    case VT_DISPATCH:
-        value->punkVal = *source.ppunkVal;
-        break;
-    case VT_RECORD:
+    if (base == VT_RECORD)
         return DISP_E_TYPEMISMATCH;
-    default: // eight bytes wide
-        value->llVal = *source.pllVal;
-        break;
-    }
-    value->vt = base;
-    return S_OK;
+    return LoadReferenced(source, value);
 }
 
 // A number on its way between types.

@@ -385,4 +385,49 @@ bool IsKnownLocale(LCID lcid) {
     }
 }
 
+HRESULT LoadReferenced(const VARIANT& reference, VARIANT* value) {
+    const VARTYPE base = reference.vt & VT_TYPEMASK;
+    *value = VARIANT{};
+    switch (base) {
+    case VT_DECIMAL:
+        value->decVal = *reference.pdecVal;
+        break;
+    case VT_I1:
+    case VT_UI1:
+        value->bVal = *reference.pbVal;
+        break;
+    case VT_I2:
+    case VT_UI2:
+    case VT_BOOL:
+        value->iVal = *reference.piVal;
+        break;
+    case VT_I4:
+    case VT_UI4:
+    case VT_R4:
+    case VT_ERROR:
+    case VT_INT:
+    case VT_UINT:
+        value->lVal = *reference.plVal;
+        break;
+    case VT_BSTR:
+        value->bstrVal = *reference.pbstrVal;
+        break;
+    case VT_UNKNOWN:
+    case VT_DISPATCH:
+        value->punkVal = *reference.ppunkVal;
+        break;
+    case VT_I8:
+    case VT_UI8:
+    case VT_R8:
+    case VT_CY:
+    case VT_DATE:
+        value->llVal = *reference.pllVal;
+        break;
+    default:
+        return DISP_E_BADVARTYPE;
+    }
+    value->vt = base;
+    return S_OK;
+}
+
 } // namespace vkw32::oleaut

@@ -58,6 +58,10 @@ std::string FormatInteger(Int128 value);
 
 HRESULT TextToBstr(const std::string& text, BSTR* result);
 
+// The scalar, string or interface a by-reference variant points to, as a
+// bitwise variant of its base type; DISP_E_BADVARTYPE for any other base.
+HRESULT LoadReferenced(const VARIANT& reference, VARIANT* value);
+
 // The locales whose number text this platform knows: those of
 // VarBstrFromDate.
 bool IsKnownLocale(LCID lcid);

@@ -4,6 +4,7 @@
 // here by code unit where the system compares linguistically, so the shared
 // cases are those both orders agree on.
 #include "support/wine.h"
+#include "win32/variant_cases.h"
 
 #include <vaskel/win32.h>
 
@@ -16,22 +17,9 @@ namespace {
 
 using vaskel_test::RunningOnWine;
 
-#ifdef _WIN32
-constexpr bool kOwnImplementation = false;
-#else
-constexpr bool kOwnImplementation = true;
-#endif
-
-constexpr LCID kEnglishUs = 0x409;
-
-// A variant that clears itself.
-struct Var {
-    VARIANT v;
-    Var() { VariantInit(&v); }
-    ~Var() { VariantClear(&v); }
-    Var(const Var&) = delete;
-    Var& operator=(const Var&) = delete;
-};
+using vaskel_test::kEnglishUs;
+using vaskel_test::kOwnImplementation;
+using vaskel_test::Var;
 
 struct Text : Var {
     explicit Text(const std::string& ascii) {

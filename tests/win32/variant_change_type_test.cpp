@@ -5,6 +5,7 @@
 // from Wine's oleaut32.
 #include "support/counting_unknown.h"
 #include "support/wine.h"
+#include "win32/variant_cases.h"
 
 #include <vaskel/win32.h>
 
@@ -22,23 +23,9 @@ namespace {
 using vaskel_test::CountingUnknown;
 using vaskel_test::RunningOnWine;
 
-#ifdef _WIN32
-constexpr bool kOwnImplementation = false;
-#else
-constexpr bool kOwnImplementation = true;
-#endif
-
-constexpr LCID kEnglishUs = 0x409;
-
-// A variant that clears itself.
-struct Var {
-    VARIANT v;
-    Var() { VariantInit(&v); }
-    ~Var() { VariantClear(&v); }
-    Var(const Var&) = delete;
-    Var& operator=(const Var&) = delete;
-    VARIANT* operator&() { return &v; }
-};
+using vaskel_test::kEnglishUs;
+using vaskel_test::kOwnImplementation;
+using vaskel_test::Var;
 
 BSTR Bstr(const std::string& ascii) {
     std::basic_string<OLECHAR> wide(ascii.begin(), ascii.end());

@@ -560,7 +560,8 @@ public:
     // Holds nothing for OwnershipTake.
     safearrayvector(const VARIANT& value, EVariantOwnershipOptions ownership);
     // A copy borrows what a borrowing vector borrows and deep-copies what an
-    // owning vector owns, so every VARIANT is released once.
+    // owning vector owns, so every VARIANT is released once; a copy that
+    // fails throws _com_error.
     safearrayvector(const safearrayvector& other);
     safearrayvector& operator=(const safearrayvector& other);
     ~safearrayvector() { Reset(); }

@@ -276,7 +276,9 @@ orvariant_t& orvariant_t::operator=(const orvariant_t& source) {
 }
 
 orvariant_t& orvariant_t::operator=(const VARIANT& source) {
-    Check(Copy(this, &source));
+    // Copying onto itself would clear the source before reading it.
+    if (&source != this)
+        Check(Copy(this, &source));
     return *this;
 }
 

@@ -180,6 +180,9 @@ TEST(OrVariantAssignment, ReleasesTheOldContentWhenTheTypeChanges) {
     value = "again";
     value = Ole("wide").c_str();
     EXPECT_EQ(Ole(value.bstrVal), Ole("wide"));
+    orvariant_t& same = value;
+    value = same; // onto itself: kept, not cleared first
+    EXPECT_EQ(Ole(value.bstrVal), Ole("wide"));
     value = orvariant_t(9ULL);
     EXPECT_EQ(value.vt, VT_UI8);
     DECIMAL decimal{};

@@ -142,3 +142,5 @@ struct IDispatch : IUnknown {
                                              EXCEPINFO* exception, UINT* argumentError) = 0;
 };
 typedef IDispatch* LPDISPATCH;
+
+extern "C" const IID IID_IDispatch;

@@ -9,3 +9,5 @@ struct IUnknown {
     virtual ULONG STDMETHODCALLTYPE Release() = 0;
 };
 typedef IUnknown* LPUNKNOWN;
+
+extern "C" const IID IID_IUnknown;

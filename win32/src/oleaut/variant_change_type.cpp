@@ -9,10 +9,6 @@ using namespace vkw32::oleaut;
 
 namespace {
 
-// {00000000-0000-0000-C000-000000000046} and {00020400-...}.
-constexpr GUID kIidUnknown = {0x00000000, 0x0000, 0x0000, {0xC0, 0, 0, 0, 0, 0, 0, 0x46}};
-constexpr GUID kIidDispatch = {0x00020400, 0x0000, 0x0000, {0xC0, 0, 0, 0, 0, 0, 0, 0x46}};
-
 // The first day and the day after the last that a date holds.
 constexpr double kDateLow = -657435.0;
 constexpr double kDateHigh = 2958466.0;
@@ -528,7 +524,7 @@ HRESULT Change(const VARIANT& source, LCID lcid, USHORT flags, VARTYPE vt, VARIA
             return DISP_E_TYPEMISMATCH; // IDispatch::Invoke(DISPID_VALUE) is not called
         void* object = nullptr;
         if (value.punkVal) {
-            hr = value.punkVal->QueryInterface(vt == VT_DISPATCH ? kIidDispatch : kIidUnknown,
+            hr = value.punkVal->QueryInterface(vt == VT_DISPATCH ? IID_IDispatch : IID_IUnknown,
                                                &object);
             if (FAILED(hr))
                 return hr;

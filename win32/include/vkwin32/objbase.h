@@ -39,4 +39,13 @@ HRESULT WINAPI CLSIDFromString(LPCOLESTR text, LPCLSID clsid);
 HRESULT WINAPI CLSIDFromProgID(LPCOLESTR progId, LPCLSID clsid);
 HRESULT WINAPI ProgIDFromCLSID(REFCLSID clsid, LPOLESTR* progId);
 
+// A stream on global memory. A null block is replaced by a new movable block of
+// no bytes; a given block's bytes are the stream's first contents and its
+// GlobalSize the stream's first size. Clones share the block, each with its
+// own seek pointer; with deleteOnRelease the block is freed when the last of
+// them is released. A null output is E_INVALIDARG; GetHGlobalFromStream gives
+// E_INVALIDARG for a stream that this function did not make.
+HRESULT WINAPI CreateStreamOnHGlobal(HGLOBAL global, BOOL deleteOnRelease, LPSTREAM* stream);
+HRESULT WINAPI GetHGlobalFromStream(LPSTREAM stream, HGLOBAL* global);
+
 } // extern "C"

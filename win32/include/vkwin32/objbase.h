@@ -12,6 +12,20 @@
 
 #define RPC_E_CHANGED_MODE VKW32_HR(0x80010106)
 
+#define CLSCTX_INPROC_SERVER 0x1
+#define CLSCTX_INPROC_HANDLER 0x2
+#define CLSCTX_LOCAL_SERVER 0x4
+#define CLSCTX_REMOTE_SERVER 0x10
+#define CLSCTX_INPROC (CLSCTX_INPROC_SERVER | CLSCTX_INPROC_HANDLER)
+#define CLSCTX_SERVER (CLSCTX_INPROC_SERVER | CLSCTX_LOCAL_SERVER | CLSCTX_REMOTE_SERVER)
+#define CLSCTX_ALL (CLSCTX_INPROC | CLSCTX_LOCAL_SERVER | CLSCTX_REMOTE_SERVER)
+
+#define REGCLS_SINGLEUSE 0
+#define REGCLS_MULTIPLEUSE 1
+#define REGCLS_MULTI_SEPARATE 2
+#define REGCLS_SUSPENDED 4
+#define REGCLS_SURROGATE 8
+
 extern "C" {
 
 HRESULT WINAPI CoInitialize(LPVOID reserved);
@@ -47,5 +61,25 @@ HRESULT WINAPI ProgIDFromCLSID(REFCLSID clsid, LPOLESTR* progId);
 // E_INVALIDARG for a stream that this function did not make.
 HRESULT WINAPI CreateStreamOnHGlobal(HGLOBAL global, BOOL deleteOnRelease, LPSTREAM* stream);
 HRESULT WINAPI GetHGlobalFromStream(LPSTREAM stream, HGLOBAL* global);
+
+// Class objects registered by this process. Registration holds a reference
+// until CoRevokeClassObject; several registrations of one class are
+// independent, each with its own non-zero cookie. Multiple use with
+// CLSCTX_LOCAL_SERVER serves in-process requests too, separate multiple use
+// only the contexts named; single use serves CLSCTX_LOCAL_SERVER only (with
+// CLSCTX_INPROC_SERVER it is E_INVALIDARG) and hides the object after its
+// first connection. REGCLS_SUSPENDED is E_INVALIDARG: there is no
+// CoResumeClassObjects. Classes not registered here are REGDB_E_CLASSNOTREG:
+// there are no in-process servers from the registry. Every function needs the
+// thread's apartment (CO_E_NOTINITIALIZED); an unknown cookie is
+// CO_E_OBJNOTREG; CoCreateInstance makes the instance through the class's
+// IClassFactory and leaves null in the output on failure.
+HRESULT WINAPI CoRegisterClassObject(REFCLSID clsid, LPUNKNOWN object, DWORD clsContext,
+                                     DWORD flags, LPDWORD cookie);
+HRESULT WINAPI CoRevokeClassObject(DWORD cookie);
+HRESULT WINAPI CoGetClassObject(REFCLSID clsid, DWORD clsContext, LPVOID serverInfo, REFIID riid,
+                                LPVOID* object);
+HRESULT WINAPI CoCreateInstance(REFCLSID clsid, LPUNKNOWN outer, DWORD clsContext, REFIID riid,
+                                LPVOID* object);
 
 } // extern "C"

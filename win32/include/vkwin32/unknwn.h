@@ -11,3 +11,15 @@ struct IUnknown {
 typedef IUnknown* LPUNKNOWN;
 
 extern "C" const IID IID_IUnknown;
+
+// The class object that makes instances of a class. CreateInstance with an
+// outer unknown asks for an aggregated instance, which a class may refuse with
+// CLASS_E_NOAGGREGATION; LockServer keeps the server loaded.
+struct IClassFactory : IUnknown {
+    virtual HRESULT STDMETHODCALLTYPE CreateInstance(IUnknown* outer, REFIID riid,
+                                                     void** object) = 0;
+    virtual HRESULT STDMETHODCALLTYPE LockServer(BOOL lock) = 0;
+};
+typedef IClassFactory* LPCLASSFACTORY;
+
+extern "C" const IID IID_IClassFactory;

@@ -1,5 +1,7 @@
 // A thread's COM apartment: entered by the first initialisation, counted by
 // the following ones, left when the count returns to zero.
+#include "apartment.h"
+
 #include <vkwin32/objbase.h>
 
 namespace {
@@ -12,6 +14,10 @@ struct Apartment {
 thread_local Apartment apartment;
 
 } // namespace
+
+bool vkw32::InApartment() {
+    return apartment.count > 0;
+}
 
 extern "C" HRESULT WINAPI CoInitializeEx(LPVOID /*reserved*/, DWORD coInit) {
     bool multithreaded = (coInit & COINIT_APARTMENTTHREADED) == 0;

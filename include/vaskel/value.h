@@ -450,6 +450,9 @@ private:
     // Clears unless the type is already this one, then sets it.
     void Retype(VARTYPE type);
     void SetString(BSTR owned);
+    // Holds the interface under the type (VT_DISPATCH's pointer overlays
+    // VT_UNKNOWN's), with a reference of its own.
+    void SetInterface(VARTYPE type, IUnknown* value);
 };
 
 // A one-byte true, false or unknown; false < true < unknown.

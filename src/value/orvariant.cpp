@@ -420,7 +420,7 @@ orvariant_t& orvariant_t::operator=(const _bstr_t& value) {
 }
 
 // The reference is taken first, so assigning the held pointer keeps it alive.
-orvariant_t& orvariant_t::operator=(IDispatch* value) {
+void orvariant_t::SetInterface(VARTYPE type, IUnknown* value) {
     if (value)
         value->AddRef();
     const HRESULT hr = VariantClear(this);
@@ -429,22 +429,17 @@ orvariant_t& orvariant_t::operator=(IDispatch* value) {
             value->Release();
         Throw(hr);
     }
-    vt = VT_DISPATCH;
-    pdispVal = value;
+    vt = type;
+    punkVal = value;
+}
+
+orvariant_t& orvariant_t::operator=(IDispatch* value) {
+    SetInterface(VT_DISPATCH, value);
     return *this;
 }
 
 orvariant_t& orvariant_t::operator=(IUnknown* value) {
-    if (value)
-        value->AddRef();
-    const HRESULT hr = VariantClear(this);
-    if (FAILED(hr)) {
-        if (value)
-            value->Release();
-        Throw(hr);
-    }
-    vt = VT_UNKNOWN;
-    punkVal = value;
+    SetInterface(VT_UNKNOWN, value);
     return *this;
 }
 

@@ -9,12 +9,16 @@
 #include <float.h>
 #include <mbstring.h>
 #include <windows.h>
+// Connection points (ocidl.h) and their error codes, which live in olectl.h.
+#include <olectl.h>
 // Shell folder paths; not part of windows.h.
 #include <shlobj.h>
 // Process-status services; not part of windows.h.
 #include <psapi.h>
 // The compiler's COM support types: _bstr_t, _variant_t, _com_error.
 #include <comdef.h>
+// The COM+ administration catalog; not part of windows.h.
+#include <comadmin.h>
 // Some runtime headers name only the exception masks; the status bits are the same.
 #ifndef _SW_INVALID
 #define _SW_INVALID _EM_INVALID

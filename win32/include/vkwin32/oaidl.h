@@ -110,6 +110,7 @@ struct tagVARIANT {
 
 typedef LONG DISPID;
 typedef DISPID MEMBERID;
+#define DISPID_UNKNOWN (-1)
 struct ITypeInfo;
 
 typedef struct tagDISPPARAMS {

@@ -26,6 +26,23 @@
 #define REGCLS_SUSPENDED 4
 #define REGCLS_SURROGATE 8
 
+// The destination of a marshalled interface, and whether its packet may be
+// read once (normal) or until CoReleaseMarshalData (table).
+#define MSHCTX_LOCAL 0
+#define MSHCTX_NOSHAREDMEM 1
+#define MSHCTX_DIFFERENTMACHINE 2
+#define MSHCTX_INPROC 3
+#define MSHCTX_CROSSCTX 4
+
+#define MSHLFLAGS_NORMAL 0
+#define MSHLFLAGS_TABLESTRONG 1
+#define MSHLFLAGS_TABLEWEAK 2
+#define MSHLFLAGS_NOPING 4
+
+extern "C" const GUID GUID_NULL;
+#define IID_NULL GUID_NULL
+#define CLSID_NULL GUID_NULL
+
 extern "C" {
 
 HRESULT WINAPI CoInitialize(LPVOID reserved);
@@ -81,5 +98,36 @@ HRESULT WINAPI CoGetClassObject(REFCLSID clsid, DWORD clsContext, LPVOID serverI
                                 LPVOID* object);
 HRESULT WINAPI CoCreateInstance(REFCLSID clsid, LPUNKNOWN outer, DWORD clsContext, REFIID riid,
                                 LPVOID* object);
+
+// Interface marshalling within the process. A packet names an entry in a
+// process-wide table (with a per-process secret), never a pointer: a packet
+// that is forged or not from this process is RPC_E_INVALID_OBJREF, one cut
+// short STG_E_READFAULT, one already consumed, released or disconnected
+// CO_E_OBJNOTCONNECTED, and nothing is dereferenced. The entry holds one
+// reference to the interface. A normal packet is consumed by its first
+// CoUnmarshalInterface; table packets stay until CoReleaseMarshalData, which
+// also consumes a normal packet that was never read; leaving the apartment
+// that marshalled a packet disconnects it. IID_NULL unmarshals the interface
+// that was marshalled. Every function needs the thread's apartment
+// (CO_E_NOTINITIALIZED). There are no proxies on this platform: a packet read
+// on any thread of the process, in any apartment, gives the object's own
+// interface.
+HRESULT WINAPI CoGetMarshalSizeMax(ULONG* size, REFIID riid, LPUNKNOWN object, DWORD destContext,
+                                   LPVOID pvDestContext, DWORD mshlflags);
+HRESULT WINAPI CoMarshalInterface(LPSTREAM stream, REFIID riid, LPUNKNOWN object, DWORD destContext,
+                                  LPVOID pvDestContext, DWORD mshlflags);
+HRESULT WINAPI CoUnmarshalInterface(LPSTREAM stream, REFIID riid, LPVOID* object);
+HRESULT WINAPI CoReleaseMarshalData(LPSTREAM stream);
+
+// Monikers. CreateBindCtx needs reserved 0 (E_INVALIDARG). An objref moniker
+// holds its object; its display name is "objref:" + Base64 of a normal
+// marshal packet + ":", so each name binds once. MkParseDisplayName takes
+// such names (the prefix in any case) and gives MK_E_SYNTAX and no moniker
+// for any other text, with the characters parsed in eaten: 0, or the name's
+// length when text follows it. A forged or stale name fails when bound.
+HRESULT WINAPI CreateBindCtx(DWORD reserved, LPBC* bindContext);
+HRESULT WINAPI CreateObjrefMoniker(LPUNKNOWN object, LPMONIKER* moniker);
+HRESULT WINAPI MkParseDisplayName(LPBC bindContext, LPCOLESTR name, ULONG* eaten,
+                                  LPMONIKER* moniker);
 
 } // extern "C"

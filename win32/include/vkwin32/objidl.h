@@ -100,3 +100,120 @@ typedef IStream* LPSTREAM;
 
 extern "C" const IID IID_ISequentialStream;
 extern "C" const IID IID_IStream;
+
+// Persistence and monikers. The objref moniker is the only moniker class on
+// this platform; the enumerator, running-object-table and string-enumerator
+// interfaces are named here only so that the vtables keep Windows' shape.
+struct IMoniker;
+struct IBindCtx;
+struct IEnumMoniker;
+struct IRunningObjectTable;
+struct IEnumString;
+
+struct IPersist : IUnknown {
+    virtual HRESULT STDMETHODCALLTYPE GetClassID(CLSID* pClassID) = 0;
+};
+typedef IPersist* LPPERSIST;
+
+struct IPersistStream : IPersist {
+    virtual HRESULT STDMETHODCALLTYPE IsDirty() = 0;
+    virtual HRESULT STDMETHODCALLTYPE Load(IStream* pStm) = 0;
+    virtual HRESULT STDMETHODCALLTYPE Save(IStream* pStm, BOOL fClearDirty) = 0;
+    virtual HRESULT STDMETHODCALLTYPE GetSizeMax(ULARGE_INTEGER* pcbSize) = 0;
+};
+typedef IPersistStream* LPPERSISTSTREAM;
+
+typedef enum tagMKSYS {
+    MKSYS_NONE = 0,
+    MKSYS_GENERICCOMPOSITE = 1,
+    MKSYS_FILEMONIKER = 2,
+    MKSYS_ANTIMONIKER = 3,
+    MKSYS_ITEMMONIKER = 4,
+    MKSYS_POINTERMONIKER = 5,
+    MKSYS_CLASSMONIKER = 7,
+    MKSYS_OBJREFMONIKER = 8,
+    MKSYS_SESSIONMONIKER = 9,
+    MKSYS_LUAMONIKER = 10
+} MKSYS;
+
+typedef enum tagMKREDUCE {
+    MKRREDUCE_ONE = 3 << 16,
+    MKRREDUCE_TOUSER = 2 << 16,
+    MKRREDUCE_THROUGHUSER = 1 << 16,
+    MKRREDUCE_ALL = 0
+} MKRREDUCE;
+
+struct IMoniker : IPersistStream {
+    virtual HRESULT STDMETHODCALLTYPE BindToObject(IBindCtx* pbc, IMoniker* pmkToLeft,
+                                                   REFIID riidResult, void** ppvResult) = 0;
+    virtual HRESULT STDMETHODCALLTYPE BindToStorage(IBindCtx* pbc, IMoniker* pmkToLeft, REFIID riid,
+                                                    void** ppvObj) = 0;
+    virtual HRESULT STDMETHODCALLTYPE Reduce(IBindCtx* pbc, DWORD dwReduceHowFar,
+                                             IMoniker** ppmkToLeft, IMoniker** ppmkReduced) = 0;
+    virtual HRESULT STDMETHODCALLTYPE ComposeWith(IMoniker* pmkRight, BOOL fOnlyIfNotGeneric,
+                                                  IMoniker** ppmkComposite) = 0;
+    virtual HRESULT STDMETHODCALLTYPE Enum(BOOL fForward, IEnumMoniker** ppenumMoniker) = 0;
+    virtual HRESULT STDMETHODCALLTYPE IsEqual(IMoniker* pmkOtherMoniker) = 0;
+    virtual HRESULT STDMETHODCALLTYPE Hash(DWORD* pdwHash) = 0;
+    virtual HRESULT STDMETHODCALLTYPE IsRunning(IBindCtx* pbc, IMoniker* pmkToLeft,
+                                                IMoniker* pmkNewlyRunning) = 0;
+    virtual HRESULT STDMETHODCALLTYPE GetTimeOfLastChange(IBindCtx* pbc, IMoniker* pmkToLeft,
+                                                          FILETIME* pFileTime) = 0;
+    virtual HRESULT STDMETHODCALLTYPE Inverse(IMoniker** ppmk) = 0;
+    virtual HRESULT STDMETHODCALLTYPE CommonPrefixWith(IMoniker* pmkOther,
+                                                       IMoniker** ppmkPrefix) = 0;
+    virtual HRESULT STDMETHODCALLTYPE RelativePathTo(IMoniker* pmkOther,
+                                                     IMoniker** ppmkRelPath) = 0;
+    virtual HRESULT STDMETHODCALLTYPE GetDisplayName(IBindCtx* pbc, IMoniker* pmkToLeft,
+                                                     LPOLESTR* ppszDisplayName) = 0;
+    virtual HRESULT STDMETHODCALLTYPE ParseDisplayName(IBindCtx* pbc, IMoniker* pmkToLeft,
+                                                       LPOLESTR pszDisplayName, ULONG* pchEaten,
+                                                       IMoniker** ppmkOut) = 0;
+    virtual HRESULT STDMETHODCALLTYPE IsSystemMoniker(DWORD* pdwMksys) = 0;
+};
+typedef IMoniker* LPMONIKER;
+
+typedef enum tagBIND_FLAGS { BIND_MAYBOTHERUSER = 1, BIND_JUSTTESTEXISTENCE = 2 } BIND_FLAGS;
+
+typedef struct tagBIND_OPTS {
+    DWORD cbStruct; // the caller's size of the structure
+    DWORD grfFlags; // BIND_FLAGS
+    DWORD grfMode;  // STGM flags
+    DWORD dwTickCountDeadline;
+} BIND_OPTS, *LPBIND_OPTS;
+
+// A bind context holds the objects bound during an operation (released with
+// it or by ReleaseBoundObjects), objects registered under a key, and the bind
+// options. There is no running object table on this platform.
+struct IBindCtx : IUnknown {
+    virtual HRESULT STDMETHODCALLTYPE RegisterObjectBound(IUnknown* punk) = 0;
+    virtual HRESULT STDMETHODCALLTYPE RevokeObjectBound(IUnknown* punk) = 0;
+    virtual HRESULT STDMETHODCALLTYPE ReleaseBoundObjects() = 0;
+    virtual HRESULT STDMETHODCALLTYPE SetBindOptions(BIND_OPTS* pbindopts) = 0;
+    virtual HRESULT STDMETHODCALLTYPE GetBindOptions(BIND_OPTS* pbindopts) = 0;
+    virtual HRESULT STDMETHODCALLTYPE GetRunningObjectTable(IRunningObjectTable** pprot) = 0;
+    virtual HRESULT STDMETHODCALLTYPE RegisterObjectParam(LPOLESTR pszKey, IUnknown* punk) = 0;
+    virtual HRESULT STDMETHODCALLTYPE GetObjectParam(LPOLESTR pszKey, IUnknown** ppunk) = 0;
+    virtual HRESULT STDMETHODCALLTYPE EnumObjectParam(IEnumString** ppenum) = 0;
+    virtual HRESULT STDMETHODCALLTYPE RevokeObjectParam(LPOLESTR pszKey) = 0;
+};
+typedef IBindCtx* LPBC;
+typedef IBindCtx* LPBINDCTX;
+
+extern "C" const IID IID_IPersist;
+extern "C" const IID IID_IPersistStream;
+extern "C" const IID IID_IMoniker;
+extern "C" const IID IID_IBindCtx;
+
+// An object that may be loaded without running (an embedded object's
+// handler): Run makes it run; OleRun calls it for objects that have it.
+struct IRunnableObject : IUnknown {
+    virtual HRESULT STDMETHODCALLTYPE GetRunningClass(LPCLSID lpClsid) = 0;
+    virtual HRESULT STDMETHODCALLTYPE Run(LPBINDCTX pbc) = 0;
+    virtual BOOL STDMETHODCALLTYPE IsRunning() = 0;
+    virtual HRESULT STDMETHODCALLTYPE LockRunning(BOOL fLock, BOOL fLastUnlockCloses) = 0;
+    virtual HRESULT STDMETHODCALLTYPE SetContainedObject(BOOL fContained) = 0;
+};
+typedef IRunnableObject* LPRUNNABLEOBJECT;
+
+extern "C" const IID IID_IRunnableObject;

@@ -1,11 +1,14 @@
 // The Win32 subset that vaskel implements on POSIX systems.
 #pragma once
 
+#include "comadmin.h"
 #include "crt.h"
 #include "interlocked.h"
 #include "kernel.h"
 #include "mmsystem.h"
 #include "objbase.h"
+#include "ocidl.h"
+#include "ole2.h"
 #include "oleauto.h"
 #include "process.h"
 #include "psapi.h"

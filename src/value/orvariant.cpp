@@ -1,3 +1,5 @@
+#include "text/wide_string.h"
+
 #include <vaskel/value.h>
 
 #include <cmath>
@@ -45,32 +47,11 @@ BSTR NewString(const OLECHAR* text) {
     return string;
 }
 
-// One pass: a text never has more UTF-16 units than bytes in any code page,
-// so its byte length is room enough, and only a text that converts shorter
-// needs its string cut to size.
 BSTR NewString(const char* text) {
-    if (!text)
-        return nullptr;
-    const std::size_t bytes = std::strlen(text);
-    if (bytes > 0x3FFFFFFF)
-        Throw(E_OUTOFMEMORY);
-    BSTR string = SysAllocStringLen(nullptr, static_cast<UINT>(bytes));
-    if (!string)
-        Throw(E_OUTOFMEMORY);
-    if (bytes == 0)
-        return string;
-    const int units = MultiByteToWideChar(CP_ACP, 0, text, static_cast<int>(bytes), string,
-                                          static_cast<int>(bytes));
-    if (units <= 0) {
-        const HRESULT hr = HRESULT_FROM_WIN32(GetLastError());
-        SysFreeString(string);
-        Throw(hr);
-    }
-    if (static_cast<std::size_t>(units) < bytes && !SysReAllocStringLen(&string, string, units)) {
-        SysFreeString(string);
-        Throw(E_OUTOFMEMORY);
-    }
-    return string;
+    WideString string(text, CP_ACP);
+    if (FAILED(string.Status()))
+        Throw(string.Status());
+    return string.Detach();
 }
 
 // Byte-exact, so an odd byte length and embedded NULs survive; throws

@@ -116,8 +116,9 @@ TEST(ErrorText, GivesTheSystemTextWithItsLineBreak) {
     ASSERT_GT(text.GetLength(), 2);
     EXPECT_STREQ(text.Right(2), "\r\n");
     // Wine words its message table differently from Windows.
-    if (!vaskel_test::RunningOnWine())
+    if (!vaskel_test::RunningOnWine()) {
         EXPECT_STREQ(text, "The system cannot find the file specified.\r\n");
+    }
     EXPECT_STREQ(KXFormatErrorMessage(0x2FFFFFFF), "");
 }
 

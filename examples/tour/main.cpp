@@ -1,12 +1,18 @@
 // A tour of vaskel: each family at work, printing what it did.
+// The small event source that the tests use serves the tour too.
+#include "support/event_source.h"
+
 #include <vaskel/calendar.h>
 #include <vaskel/diag.h>
+#include <vaskel/event_sink.h>
 #include <vaskel/framework/archive.h>
 #include <vaskel/framework/array.h>
 #include <vaskel/framework/list.h>
 #include <vaskel/framework/mem_file.h>
+#include <vaskel/framework/ole_safe_array.h>
 #include <vaskel/framework/string.h>
 #include <vaskel/fs.h>
+#include <vaskel/marshal.h>
 #include <vaskel/namevalue.h>
 #include <vaskel/queue.h>
 #include <vaskel/registry.h>
@@ -211,8 +217,10 @@ void TourAutomationValues() {
 
     const char clsid[] = "{6B29FC40-CA47-1067-B31D-00DD010662DA}";
     const bool registered =
-        RunRegistryTool(std::string("add HKCR\\VaskelTour.Greeter\\CLSID /ve /d ") + clsid + " /f") &&
-        RunRegistryTool(std::string("add HKCR\\CLSID\\") + clsid + "\\ProgID /ve /d VaskelTour.Greeter /f");
+        RunRegistryTool(std::string("add HKCR\\VaskelTour.Greeter\\CLSID /ve /d ") + clsid +
+                        " /f") &&
+        RunRegistryTool(std::string("add HKCR\\CLSID\\") + clsid +
+                        "\\ProgID /ve /d VaskelTour.Greeter /f");
     std::printf("the registry tool registered VaskelTour.Greeter: %s\n", registered ? "yes" : "no");
     std::printf("VaskelTour.Greeter names the class %s, whose ProgID is %s\n",
                 AsGUIDStringFromProgID("VaskelTour.Greeter").GetString(),
@@ -243,8 +251,8 @@ void TourNameValues() {
     const CVKNameValue* count = read.GetNoCase("COUNT");
     CGenericVal number;
     if (count != nullptr && number.Parse(count->GetValue().ToString(), VT_I4))
-        std::printf("'COUNT' found without case, parsed as %s: %ld\n",
-                    number.GetType().ToString(), static_cast<long>(number.GetLong()));
+        std::printf("'COUNT' found without case, parsed as %s: %ld\n", number.GetType().ToString(),
+                    static_cast<long>(number.GetLong()));
 
     const char bytes[] = "vaskel keeps bytes in blobs";
     CBlob blob(bytes, sizeof bytes - 1);
@@ -406,6 +414,68 @@ void TourMessageWindow() {
     owner.join();
 }
 
+// Prints the events that reach it.
+class TourSink : public CKXEventSink {
+public:
+    explicit TourSink(const IID& events) { SetUUID(events); }
+
+protected:
+    HRESULT OnInvoke(DISPID id, WORD, DISPPARAMS* params, VARIANT*) override {
+        std::printf("the sink received event %d with the argument %s\n", static_cast<int>(id),
+                    params && params->cArgs > 0
+                        ? orvariant_t(params->rgvarg[0]).ToString().GetString()
+                        : "-");
+        return S_OK;
+    }
+};
+
+void TourCom() {
+    Section("COM plumbing");
+    CoInitializeEx(nullptr, COINIT_MULTITHREADED);
+
+    COleSafeArray values;
+    values.CreateOneDim(VT_VARIANT, 3);
+    orvariant_t elements[] = {orvariant_t(42L), orvariant_t("marshalled"), orvariant_t(2.5)};
+    for (long index = 0; index < 3; ++index)
+        values.PutElement(&index, &elements[index]);
+    IStream* stream = nullptr;
+    CreateStreamOnHGlobal(nullptr, TRUE, &stream);
+    ULONG size = 0;
+    CMarshalHelper::GetVariantSizeForMarshalling(values, size, MSHCTX_INPROC, nullptr,
+                                                 MSHLFLAGS_NORMAL);
+    const HRESULT written = CMarshalHelper::WriteVariantForMarshalling(
+        values, stream, MSHCTX_INPROC, nullptr, MSHLFLAGS_NORMAL);
+    std::printf("an array of three variants takes %u bytes in a stream; written: %s\n",
+                static_cast<unsigned>(size), SUCCEEDED(written) ? "yes" : "no");
+    const LARGE_INTEGER start = {};
+    stream->Seek(start, STREAM_SEEK_SET, nullptr);
+    orvariant_t back;
+    const HRESULT read = CMarshalHelper::ReadVariantFromMarshalling(back, stream);
+    stream->Release();
+    const safearrayvector vector(back, OwnershipBorrow);
+    std::printf("read back (%s) as an array of %u variants:", SUCCEEDED(read) ? "ok" : "failed",
+                static_cast<unsigned>(vector.size()));
+    for (const_safearrayiterator it = vector.begin(); it != vector.end(); ++it)
+        std::printf(" '%s'", orvariant_t(*it).ToString().GetString());
+    std::printf("\n");
+
+    const IID events = {
+        0x3D5A1C40, 0x77E2, 0x4B19, {0x9A, 0x0E, 0x61, 0x2F, 0xC4, 0x58, 0xB3, 0x07}};
+    vaskel_test::EventSource source(events);
+    TourSink* sink = new TourSink(events);
+    std::printf("the sink connects to the source: %s\n", sink->ConnectSink(&source) ? "yes" : "no");
+    VARIANT argument;
+    VariantInit(&argument);
+    argument.vt = VT_I4;
+    argument.lVal = 7;
+    source.Fire(1, {argument});
+    std::printf("the sink disconnects: %s\n", sink->DisconnectSink() ? "yes" : "no");
+    std::printf("a second event reaches %u sinks\n",
+                static_cast<unsigned>(source.Fire(2, {argument}).size()));
+    sink->ExternalRelease();
+    CoUninitialize();
+}
+
 } // namespace
 
 struct CountCmd : CVKAsyncCmd {
@@ -560,5 +630,6 @@ int main(int argc, char* argv[]) {
     TourTimers();
     TourTimerController();
     TourAutomationValues();
+    TourCom();
     return 0;
 }

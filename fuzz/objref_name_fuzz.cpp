@@ -12,7 +12,8 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     static const HRESULT com = CoInitializeEx(nullptr, COINIT_MULTITHREADED);
     (void)com;
     const std::string text(reinterpret_cast<const char*>(data), size);
-    IUnknown* untouched = reinterpret_cast<IUnknown*>(&com);
+    static char marker;
+    IUnknown* const untouched = reinterpret_cast<IUnknown*>(&marker);
     IUnknown* object = untouched;
     if (SUCCEEDED(vaskel::COMObjRef::ParseDisplayName(text.c_str(), IID_IUnknown, &object)) ||
         object != untouched)

@@ -10,6 +10,7 @@
 
 #include <atomic>
 #include <cstring>
+#include <future>
 #include <thread>
 #include <vector>
 
@@ -327,6 +328,42 @@ TEST_F(MarshalTest, PacketReadInTheSameMultithreadedApartmentGivesTheObject) {
         CoUninitialize();
     });
     owner.join();
+    EXPECT_EQ(object.references.load(), 1u);
+}
+
+// The test's single-threaded apartment reads what the multithreaded one
+// marshalled: Windows gives a proxy, this platform the object itself; either
+// answers for its identity, and every reference is gone once the owner's
+// apartment ends.
+TEST_F(MarshalTest, PacketReadInAnotherApartmentGivesAUsableInterface) {
+    PlainObject object;
+    IStream* stream = NewStream();
+    std::promise<void> marshalled;
+    std::promise<void> done;
+    std::thread owner([&] {
+        ASSERT_EQ(CoInitializeEx(nullptr, COINIT_MULTITHREADED), S_OK);
+        EXPECT_EQ(CoMarshalInterface(stream, IID_IUnknown, &object, MSHCTX_INPROC, nullptr,
+                                     MSHLFLAGS_NORMAL),
+                  S_OK);
+        marshalled.set_value();
+        done.get_future().wait();
+        CoUninitialize();
+    });
+    marshalled.get_future().wait();
+    Rewind(stream);
+    IUnknown* read = nullptr;
+    EXPECT_EQ(CoUnmarshalInterface(stream, IID_IUnknown, reinterpret_cast<void**>(&read)), S_OK);
+    EXPECT_NE(read, nullptr);
+    if (read) {
+        IUnknown* identity = nullptr;
+        EXPECT_EQ(read->QueryInterface(IID_IUnknown, reinterpret_cast<void**>(&identity)), S_OK);
+        if (identity)
+            identity->Release();
+        read->Release();
+    }
+    done.set_value();
+    owner.join();
+    stream->Release();
     EXPECT_EQ(object.references.load(), 1u);
 }
 

@@ -3,10 +3,11 @@
 // text key; and the bind options (BIND_OPTS only, starting as no flags,
 // read-write mode and no deadline). There is no running object table and no
 // enumeration of the keys (E_NOTIMPL).
+#include "ref_counted.h"
+
 #include <vkwin32/objbase.h>
 
 #include <algorithm>
-#include <atomic>
 #include <map>
 #include <mutex>
 #include <new>
@@ -17,7 +18,7 @@ namespace {
 
 const DWORD readWriteMode = 2; // STGM_READWRITE
 
-class BindContext final : public IBindCtx {
+class BindContext final : public vkw32::RefCounted<IBindCtx> {
 public:
     BindContext() {
         options_.cbStruct = sizeof(BIND_OPTS);
@@ -46,17 +47,6 @@ public:
         }
         *object = nullptr;
         return E_NOINTERFACE;
-    }
-
-    ULONG STDMETHODCALLTYPE AddRef() override {
-        return references_.fetch_add(1, std::memory_order_relaxed) + 1;
-    }
-
-    ULONG STDMETHODCALLTYPE Release() override {
-        ULONG left = references_.fetch_sub(1, std::memory_order_acq_rel) - 1;
-        if (left == 0)
-            delete this;
-        return left;
     }
 
     HRESULT STDMETHODCALLTYPE RegisterObjectBound(IUnknown* punk) override {
@@ -183,7 +173,6 @@ public:
     }
 
 private:
-    std::atomic<ULONG> references_{1};
     std::mutex lock_;
     std::vector<IUnknown*> bound_;               // one reference each
     std::map<std::u16string, IUnknown*> params_; // one reference each

@@ -5,11 +5,12 @@
 // STG_E_INVALIDFUNCTION for SetSize and STG_E_MEDIUMFULL for Write. Commit and
 // Revert do nothing, region locks are not supported. Clones share the block
 // and its size, each with its own seek pointer.
+#include "ref_counted.h"
+
 #include <vkwin32/kernel.h>
 #include <vkwin32/objbase.h>
 
 #include <algorithm>
-#include <atomic>
 #include <cstring>
 #include <memory>
 #include <mutex>
@@ -60,7 +61,7 @@ StreamRegistry& Streams() {
     return *registry;
 }
 
-class HGlobalStream final : public IStream {
+class HGlobalStream final : public vkw32::RefCounted<IStream> {
 public:
     explicit HGlobalStream(std::shared_ptr<SharedBlock> shared, ULONGLONG position = 0)
         : shared_(std::move(shared)), position_(position) {
@@ -100,17 +101,6 @@ public:
         }
         *object = nullptr;
         return E_NOINTERFACE;
-    }
-
-    ULONG STDMETHODCALLTYPE AddRef() override {
-        return references_.fetch_add(1, std::memory_order_relaxed) + 1;
-    }
-
-    ULONG STDMETHODCALLTYPE Release() override {
-        ULONG left = references_.fetch_sub(1, std::memory_order_acq_rel) - 1;
-        if (left == 0)
-            delete this;
-        return left;
     }
 
     HRESULT STDMETHODCALLTYPE Read(void* pv, ULONG cb, ULONG* pcbRead) override {
@@ -314,7 +304,6 @@ private:
         return S_OK;
     }
 
-    std::atomic<ULONG> references_{1};
     std::shared_ptr<SharedBlock> shared_;
     ULONGLONG position_; // guarded by shared_->mutex
 };

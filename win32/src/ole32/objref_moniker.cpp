@@ -7,12 +7,13 @@
 // dereferenced. Other texts are MK_E_SYNTAX. Composition, inversion, relative
 // paths, times of change, persistence and parsing through the moniker are
 // E_NOTIMPL.
+#include "ref_counted.h"
+
 #include <vkwin32/kernel.h>
 #include <vkwin32/objbase.h>
 
 #include <boost/beast/core/detail/base64.hpp>
 
-#include <atomic>
 #include <cstring>
 #include <functional>
 #include <new>
@@ -143,7 +144,7 @@ size_t ParseName(LPCOLESTR text, std::vector<unsigned char>* packet) {
     return end + 1;
 }
 
-class ObjrefMoniker final : public IMoniker {
+class ObjrefMoniker final : public vkw32::RefCounted<IMoniker> {
 public:
     // Holds a reference to the object.
     explicit ObjrefMoniker(IUnknown* object) : object_(object) { object_->AddRef(); }
@@ -170,17 +171,6 @@ public:
         }
         *object = nullptr;
         return E_NOINTERFACE;
-    }
-
-    ULONG STDMETHODCALLTYPE AddRef() override {
-        return references_.fetch_add(1, std::memory_order_relaxed) + 1;
-    }
-
-    ULONG STDMETHODCALLTYPE Release() override {
-        ULONG left = references_.fetch_sub(1, std::memory_order_acq_rel) - 1;
-        if (left == 0)
-            delete this;
-        return left;
     }
 
     HRESULT STDMETHODCALLTYPE GetClassID(CLSID* pClassID) override {
@@ -338,7 +328,6 @@ public:
     }
 
 private:
-    std::atomic<ULONG> references_{1};
     IUnknown* object_ = nullptr;        // a made moniker's object, one reference
     std::vector<unsigned char> packet_; // a parsed moniker's packet
 };

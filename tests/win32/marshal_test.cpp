@@ -2,6 +2,7 @@
 // object, that are consumed or kept as their flags say, that release their
 // reference, and that refuse to be forged, cut short or read by a thread
 // outside COM.
+#include "support/persist_object.h"
 #include "support/wine.h"
 
 #include <vaskel/win32.h>
@@ -16,28 +17,7 @@
 
 namespace {
 
-// An object with IUnknown and IPersist that counts its references and never
-// frees itself; references may move on several threads.
-class PersistObject : public IPersist {
-public:
-    HRESULT STDMETHODCALLTYPE QueryInterface(REFIID riid, void** object) override {
-        if (riid == IID_IUnknown || riid == IID_IPersist) {
-            AddRef();
-            *object = static_cast<IPersist*>(this);
-            return S_OK;
-        }
-        *object = nullptr;
-        return E_NOINTERFACE;
-    }
-    ULONG STDMETHODCALLTYPE AddRef() override { return ++references; }
-    ULONG STDMETHODCALLTYPE Release() override { return --references; }
-    HRESULT STDMETHODCALLTYPE GetClassID(CLSID* clsid) override {
-        *clsid = CLSID_NULL;
-        return S_OK;
-    }
-
-    std::atomic<ULONG> references{1};
-};
+using vaskel_test::PersistObject;
 
 // An object that answers IUnknown only.
 class PlainObject : public IUnknown {

@@ -1,41 +1,18 @@
 // Bind contexts and object-reference monikers: what a bind context holds, and
 // display names that name an object and bind back to it.
 #include "support/ole_text.h"
+#include "support/persist_object.h"
 #include "support/wine.h"
 
 #include <vaskel/win32.h>
 
 #include <gtest/gtest.h>
 
-#include <atomic>
-
 namespace {
 
 using vaskel_test::Ole;
 using vaskel_test::OleString;
-
-// An object with IUnknown and IPersist that counts its references and never
-// frees itself.
-class PersistObject : public IPersist {
-public:
-    HRESULT STDMETHODCALLTYPE QueryInterface(REFIID riid, void** object) override {
-        if (riid == IID_IUnknown || riid == IID_IPersist) {
-            AddRef();
-            *object = static_cast<IPersist*>(this);
-            return S_OK;
-        }
-        *object = nullptr;
-        return E_NOINTERFACE;
-    }
-    ULONG STDMETHODCALLTYPE AddRef() override { return ++references; }
-    ULONG STDMETHODCALLTYPE Release() override { return --references; }
-    HRESULT STDMETHODCALLTYPE GetClassID(CLSID* clsid) override {
-        *clsid = CLSID_NULL;
-        return S_OK;
-    }
-
-    std::atomic<ULONG> references{1};
-};
+using vaskel_test::PersistObject;
 
 const CLSID clsidObjrefMoniker = {0x00000327, 0x0000, 0x0000, {0xC0, 0, 0, 0, 0, 0, 0, 0x46}};
 

@@ -455,10 +455,17 @@ TEST(MultimediaTimerTest, ThreadsMaySetAndKillEventsTogether) {
     for (std::thread& worker : workers)
         worker.join();
     PassTimerThread(100);
+    // Wine hands a fired event's identifier to the next event set, so a kill
+    // from one thread may end another thread's event: there only "at most
+    // once" holds.
+    const bool wine = vaskel_test::RunningOnWine();
     for (std::size_t i = 0; i < racers.size(); ++i) {
         EXPECT_NE(racers[i].id.load(), 0u) << "event " << i;
+        EXPECT_LE(racers[i].count.load(), 1) << "event " << i;
         // A kill succeeds exactly when it came before the callback.
         int expected = racers[i].killed == noError ? 0 : 1;
-        EXPECT_EQ(racers[i].count.load(), expected) << "event " << i;
+        if (!wine) {
+            EXPECT_EQ(racers[i].count.load(), expected) << "event " << i;
+        }
     }
 }

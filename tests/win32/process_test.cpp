@@ -10,12 +10,12 @@
 
 #include <gtest/gtest.h>
 
-#include <atomic>
 #include <bitset>
 #include <chrono>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <mutex>
 #include <string>
 #include <thread>
 #include <vector>
@@ -184,10 +184,15 @@ TEST_F(ProcessTest, WaitsForSeveralObjectsAndMessageWaitsSeeTheEnd) {
 // Starts, opens, waits for and closes processes from several threads at once:
 // every wait ends with its own process's code.
 TEST_F(ProcessTest, ThreadsStartAndWaitForProcessesAtOnce) {
-    std::atomic<int> wrong{0};
+    std::mutex lock;
+    std::vector<std::string> wrong;
+    auto report = [&](int code, const std::string& what) {
+        std::lock_guard<std::mutex> hold(lock);
+        wrong.push_back("exit " + std::to_string(code) + ": " + what);
+    };
     std::vector<std::thread> threads;
     for (int t = 0; t < 3; ++t) {
-        threads.emplace_back([t, &wrong] {
+        threads.emplace_back([t, &report] {
             for (int i = 0; i < 4; ++i) {
                 const int code = 10 * t + i;
                 std::string line = ExitAtOnce(code);
@@ -196,17 +201,22 @@ TEST_F(ProcessTest, ThreadsStartAndWaitForProcessesAtOnce) {
                 PROCESS_INFORMATION child{};
                 if (!CreateProcessA(nullptr, line.data(), nullptr, nullptr, FALSE, 0, nullptr,
                                     nullptr, &startup, &child)) {
-                    ++wrong;
+                    report(code, "not started, error " + std::to_string(GetLastError()));
                     continue;
                 }
                 HANDLE opened =
                     OpenProcess(SYNCHRONIZE | PROCESS_QUERY_INFORMATION, FALSE, child.dwProcessId);
                 DWORD first = 0, second = 0;
-                if (!opened || WaitForSingleObject(opened, generous) != WAIT_OBJECT_0 ||
-                    !GetExitCodeProcess(opened, &first) ||
-                    !GetExitCodeProcess(child.hProcess, &second) ||
-                    first != static_cast<DWORD>(code) || second != first)
-                    ++wrong;
+                if (!opened)
+                    report(code, "not opened, error " + std::to_string(GetLastError()));
+                else if (WaitForSingleObject(opened, generous) != WAIT_OBJECT_0)
+                    report(code, "the wait did not end");
+                else if (!GetExitCodeProcess(opened, &first) ||
+                         !GetExitCodeProcess(child.hProcess, &second))
+                    report(code, "no exit code");
+                else if (first != static_cast<DWORD>(code) || second != first)
+                    report(code, "ended with " + std::to_string(first) + " and " +
+                                     std::to_string(second));
                 if (opened)
                     CloseHandle(opened);
                 CloseHandle(child.hThread);
@@ -216,7 +226,7 @@ TEST_F(ProcessTest, ThreadsStartAndWaitForProcessesAtOnce) {
     }
     for (std::thread& thread : threads)
         thread.join();
-    EXPECT_EQ(wrong, 0);
+    EXPECT_TRUE(wrong.empty()) << ::testing::PrintToString(wrong);
 }
 
 TEST_F(ProcessTest, TerminateProcessEndsItWithTheCodeGiven) {

@@ -1,6 +1,7 @@
 // The COM+ catalog helpers, against an in-memory catalog registered as the
 // catalog's class object: what they store, when they save, and that every
 // interface they take is released.
+#include "com/catalog_ids.h"
 #include "support/counting_unknown.h"
 #include "support/wine.h"
 
@@ -22,22 +23,7 @@ using vaskel::CString;
 using vaskel_test::CountingUnknown;
 using Text = std::basic_string<OLECHAR>;
 
-#ifdef _WIN32
-// The Windows import libraries do not define the catalog's identifiers.
-const CLSID kCatalogClass = {
-    0xF618C514, 0xDFB8, 0x11D1, {0xA2, 0xCF, 0x00, 0x80, 0x5F, 0xC7, 0x92, 0x35}};
-const IID kCatalogInterface = {
-    0xDD662187, 0xDFC2, 0x11D1, {0xA2, 0xCF, 0x00, 0x80, 0x5F, 0xC7, 0x92, 0x35}};
-const IID kCollectionInterface = {
-    0x6EB22872, 0x8A19, 0x11D0, {0x81, 0xB6, 0x00, 0xA0, 0xC9, 0x23, 0x1C, 0x29}};
-const IID kObjectInterface = {
-    0x6EB22871, 0x8A19, 0x11D0, {0x81, 0xB6, 0x00, 0xA0, 0xC9, 0x23, 0x1C, 0x29}};
-#else
-const CLSID& kCatalogClass = CLSID_COMAdminCatalog;
-const IID& kCatalogInterface = IID_ICOMAdminCatalog;
-const IID& kCollectionInterface = IID_ICatalogCollection;
-const IID& kObjectInterface = IID_ICatalogObject;
-#endif
+using namespace vaskel::catalog_ids;
 
 bool Same(const GUID& a, const GUID& b) {
     return std::memcmp(&a, &b, sizeof(GUID)) == 0;
@@ -394,6 +380,15 @@ protected:
     }
     void TearDown() override { CoUninitialize(); }
 };
+
+#ifndef _WIN32
+TEST(CatalogIdentifiers, ThePlatformLayerDefinesWindowsValues) {
+    EXPECT_TRUE(Same(CLSID_COMAdminCatalog, kCatalogClass));
+    EXPECT_TRUE(Same(IID_ICOMAdminCatalog, kCatalogInterface));
+    EXPECT_TRUE(Same(IID_ICatalogCollection, kCollectionInterface));
+    EXPECT_TRUE(Same(IID_ICatalogObject, kObjectInterface));
+}
+#endif
 
 TEST_F(ComApartment, WithoutACatalogNothingIsCreatedOrChanged) {
     HRESULT hr = S_OK;

@@ -57,6 +57,19 @@ ULONGLONG Position(IStream* stream) {
     return position.QuadPart;
 }
 
+// Marshals the object's interface into the stream for this process.
+HRESULT Marshal(IStream* stream, REFIID iid, IUnknown* object, DWORD flags) {
+    return CoMarshalInterface(stream, iid, object, MSHCTX_INPROC, nullptr, flags);
+}
+
+// The packet at the stream's start no longer reads, and leaves the output null.
+void ExpectUnreadable(IStream* stream, REFIID iid) {
+    Rewind(stream);
+    void* out = nullptr;
+    EXPECT_TRUE(FAILED(CoUnmarshalInterface(stream, iid, &out)));
+    EXPECT_EQ(out, nullptr);
+}
+
 std::vector<unsigned char> Contents(IStream* stream) {
     STATSTG stat{};
     EXPECT_EQ(stream->Stat(&stat, STATFLAG_NONAME), S_OK);
@@ -95,9 +108,7 @@ TEST_F(MarshalTest, NormalPacketGivesTheSameObjectOnceAndBalancesReferences) {
     ASSERT_EQ(
         CoGetMarshalSizeMax(&size, IID_IPersist, &object, MSHCTX_INPROC, nullptr, MSHLFLAGS_NORMAL),
         S_OK);
-    ASSERT_EQ(
-        CoMarshalInterface(stream, IID_IPersist, &object, MSHCTX_INPROC, nullptr, MSHLFLAGS_NORMAL),
-        S_OK);
+    ASSERT_EQ(Marshal(stream, IID_IPersist, &object, MSHLFLAGS_NORMAL), S_OK);
     EXPECT_LE(Position(stream), size) << "the size is an upper bound";
     EXPECT_GT(object.references.load(), 1u) << "the packet holds the object";
 
@@ -112,10 +123,7 @@ TEST_F(MarshalTest, NormalPacketGivesTheSameObjectOnceAndBalancesReferences) {
     persist->Release();
     EXPECT_EQ(object.references.load(), 1u) << "reading a normal packet consumes it";
 
-    Rewind(stream);
-    void* again = nullptr;
-    EXPECT_TRUE(FAILED(CoUnmarshalInterface(stream, IID_IPersist, &again)));
-    EXPECT_EQ(again, nullptr);
+    ExpectUnreadable(stream, IID_IPersist);
     EXPECT_EQ(object.references.load(), 1u);
     stream->Release();
 }
@@ -123,9 +131,7 @@ TEST_F(MarshalTest, NormalPacketGivesTheSameObjectOnceAndBalancesReferences) {
 TEST_F(MarshalTest, NullIidGivesTheMarshalledInterface) {
     PersistObject object;
     IStream* stream = NewStream();
-    ASSERT_EQ(
-        CoMarshalInterface(stream, IID_IPersist, &object, MSHCTX_INPROC, nullptr, MSHLFLAGS_NORMAL),
-        S_OK);
+    ASSERT_EQ(Marshal(stream, IID_IPersist, &object, MSHLFLAGS_NORMAL), S_OK);
     Rewind(stream);
     void* out = nullptr;
     ASSERT_EQ(CoUnmarshalInterface(stream, IID_NULL, &out), S_OK);
@@ -138,19 +144,14 @@ TEST_F(MarshalTest, NullIidGivesTheMarshalledInterface) {
 TEST_F(MarshalTest, ReleasedPacketDropsItsReferenceAndCannotBeRead) {
     PersistObject object;
     IStream* stream = NewStream();
-    ASSERT_EQ(
-        CoMarshalInterface(stream, IID_IUnknown, &object, MSHCTX_INPROC, nullptr, MSHLFLAGS_NORMAL),
-        S_OK);
+    ASSERT_EQ(Marshal(stream, IID_IUnknown, &object, MSHLFLAGS_NORMAL), S_OK);
     const ULONGLONG packetEnd = Position(stream);
     Rewind(stream);
     ASSERT_EQ(CoReleaseMarshalData(stream), S_OK);
     EXPECT_EQ(Position(stream), packetEnd) << "the stream is left after the packet";
     EXPECT_EQ(object.references.load(), 1u);
 
-    Rewind(stream);
-    void* out = nullptr;
-    EXPECT_TRUE(FAILED(CoUnmarshalInterface(stream, IID_IUnknown, &out)));
-    EXPECT_EQ(out, nullptr);
+    ExpectUnreadable(stream, IID_IUnknown);
     EXPECT_EQ(object.references.load(), 1u);
     stream->Release();
 }
@@ -158,9 +159,7 @@ TEST_F(MarshalTest, ReleasedPacketDropsItsReferenceAndCannotBeRead) {
 TEST_F(MarshalTest, TablePacketReadsManyTimesUntilReleased) {
     PersistObject object;
     IStream* stream = NewStream();
-    ASSERT_EQ(CoMarshalInterface(stream, IID_IPersist, &object, MSHCTX_INPROC, nullptr,
-                                 MSHLFLAGS_TABLESTRONG),
-              S_OK);
+    ASSERT_EQ(Marshal(stream, IID_IPersist, &object, MSHLFLAGS_TABLESTRONG), S_OK);
     for (int i = 0; i < 3; ++i) {
         Rewind(stream);
         IUnknown* out = nullptr;
@@ -179,9 +178,7 @@ TEST_F(MarshalTest, TablePacketReadsManyTimesUntilReleased) {
 TEST_F(MarshalTest, ObjectWithoutTheInterfaceIsRefusedAtMarshalTime) {
     PlainObject object;
     IStream* stream = NewStream();
-    EXPECT_EQ(
-        CoMarshalInterface(stream, IID_IPersist, &object, MSHCTX_INPROC, nullptr, MSHLFLAGS_NORMAL),
-        E_NOINTERFACE);
+    EXPECT_EQ(Marshal(stream, IID_IPersist, &object, MSHLFLAGS_NORMAL), E_NOINTERFACE);
     EXPECT_EQ(Position(stream), 0u) << "nothing written";
     EXPECT_EQ(object.references.load(), 1u);
     stream->Release();
@@ -190,9 +187,7 @@ TEST_F(MarshalTest, ObjectWithoutTheInterfaceIsRefusedAtMarshalTime) {
 TEST_F(MarshalTest, WrongInterfaceAtUnmarshalTimeFailsAndLeavesATablePacket) {
     PlainObject object;
     IStream* stream = NewStream();
-    ASSERT_EQ(CoMarshalInterface(stream, IID_IUnknown, &object, MSHCTX_INPROC, nullptr,
-                                 MSHLFLAGS_TABLESTRONG),
-              S_OK);
+    ASSERT_EQ(Marshal(stream, IID_IUnknown, &object, MSHLFLAGS_TABLESTRONG), S_OK);
     Rewind(stream);
     void* out = nullptr;
     EXPECT_EQ(CoUnmarshalInterface(stream, IID_IPersist, &out), E_NOINTERFACE);
@@ -206,9 +201,7 @@ TEST_F(MarshalTest, WrongInterfaceAtUnmarshalTimeFailsAndLeavesATablePacket) {
 TEST_F(MarshalTest, DamagedPacketsAreRefused) {
     PersistObject object;
     IStream* stream = NewStream();
-    ASSERT_EQ(CoMarshalInterface(stream, IID_IPersist, &object, MSHCTX_INPROC, nullptr,
-                                 MSHLFLAGS_TABLESTRONG),
-              S_OK);
+    ASSERT_EQ(Marshal(stream, IID_IPersist, &object, MSHLFLAGS_TABLESTRONG), S_OK);
     const std::vector<unsigned char> packet = Contents(stream);
     ASSERT_GT(packet.size(), 8u);
 
@@ -240,9 +233,7 @@ TEST_F(MarshalTest, DamagedPacketsAreRefused) {
 TEST_F(MarshalTest, EveryAlteredByteIsRefusedWithoutTouchingTheObject) {
     PersistObject object;
     IStream* stream = NewStream();
-    ASSERT_EQ(CoMarshalInterface(stream, IID_IPersist, &object, MSHCTX_INPROC, nullptr,
-                                 MSHLFLAGS_TABLESTRONG),
-              S_OK);
+    ASSERT_EQ(Marshal(stream, IID_IPersist, &object, MSHLFLAGS_TABLESTRONG), S_OK);
     const std::vector<unsigned char> packet = Contents(stream);
     for (size_t i = 0; i < packet.size(); ++i) {
         std::vector<unsigned char> forged = packet;
@@ -284,9 +275,7 @@ TEST_F(MarshalTest, PacketReadInTheSameMultithreadedApartmentGivesTheObject) {
     std::thread owner([&] {
         ASSERT_EQ(CoInitializeEx(nullptr, COINIT_MULTITHREADED), S_OK);
         IStream* stream = NewStream();
-        ASSERT_EQ(CoMarshalInterface(stream, IID_IPersist, &object, MSHCTX_INPROC, nullptr,
-                                     MSHLFLAGS_TABLESTRONG),
-                  S_OK);
+        ASSERT_EQ(Marshal(stream, IID_IPersist, &object, MSHLFLAGS_TABLESTRONG), S_OK);
         std::thread reader([&] {
             ASSERT_EQ(CoInitializeEx(nullptr, COINIT_MULTITHREADED), S_OK);
             IStream* clone = nullptr;
@@ -322,9 +311,7 @@ TEST_F(MarshalTest, PacketReadInAnotherApartmentGivesAUsableInterface) {
     std::promise<void> done;
     std::thread owner([&] {
         ASSERT_EQ(CoInitializeEx(nullptr, COINIT_MULTITHREADED), S_OK);
-        EXPECT_EQ(CoMarshalInterface(stream, IID_IUnknown, &object, MSHCTX_INPROC, nullptr,
-                                     MSHLFLAGS_NORMAL),
-                  S_OK);
+        EXPECT_EQ(Marshal(stream, IID_IUnknown, &object, MSHLFLAGS_NORMAL), S_OK);
         marshalled.set_value();
         done.get_future().wait();
         CoUninitialize();
@@ -352,9 +339,7 @@ TEST_F(MarshalTest, LeavingTheApartmentReleasesWhatItMarshalled) {
     std::thread owner([&] {
         ASSERT_EQ(CoInitialize(nullptr), S_OK);
         IStream* stream = NewStream();
-        ASSERT_EQ(CoMarshalInterface(stream, IID_IPersist, &object, MSHCTX_INPROC, nullptr,
-                                     MSHLFLAGS_TABLESTRONG),
-                  S_OK);
+        ASSERT_EQ(Marshal(stream, IID_IPersist, &object, MSHLFLAGS_TABLESTRONG), S_OK);
         EXPECT_GT(object.references.load(), 1u);
         CoUninitialize();
         EXPECT_EQ(object.references.load(), 1u);
@@ -366,9 +351,7 @@ TEST_F(MarshalTest, LeavingTheApartmentReleasesWhatItMarshalled) {
 TEST_F(MarshalTest, ThreadOutsideComIsRefused) {
     PersistObject object;
     IStream* stream = NewStream();
-    ASSERT_EQ(
-        CoMarshalInterface(stream, IID_IPersist, &object, MSHCTX_INPROC, nullptr, MSHLFLAGS_NORMAL),
-        S_OK);
+    ASSERT_EQ(Marshal(stream, IID_IPersist, &object, MSHLFLAGS_NORMAL), S_OK);
     std::thread outsider([&] {
         IStream* clone = nullptr;
         ASSERT_EQ(stream->Clone(&clone), S_OK);
@@ -384,9 +367,7 @@ TEST_F(MarshalTest, ThreadOutsideComIsRefused) {
         clone->Release();
         PersistObject other;
         IStream* target = NewStream();
-        EXPECT_EQ(CoMarshalInterface(target, IID_IPersist, &other, MSHCTX_INPROC, nullptr,
-                                     MSHLFLAGS_NORMAL),
-                  CO_E_NOTINITIALIZED);
+        EXPECT_EQ(Marshal(target, IID_IPersist, &other, MSHLFLAGS_NORMAL), CO_E_NOTINITIALIZED);
         EXPECT_EQ(other.references.load(), 1u);
         target->Release();
     });
